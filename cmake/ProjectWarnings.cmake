@@ -1,0 +1,16 @@
+# Our own code builds warning-free; third-party code is never given these flags.
+function(project_warnings target)
+  target_compile_options(${target} PRIVATE -Wall -Wextra -Wpedantic -Werror)
+endfunction()
+
+# A library of the engine or a plug-in: hidden symbols but for the exported API, no "lib" prefix, found beside the
+# programs that load it.
+function(vorn_library target output_name build_macro)
+  set_target_properties(${target} PROPERTIES
+    OUTPUT_NAME "${output_name}"
+    PREFIX ""
+    DEFINE_SYMBOL "${build_macro}"
+    CXX_VISIBILITY_PRESET hidden
+    VISIBILITY_INLINES_HIDDEN ON)
+  project_warnings(${target})
+endfunction()
