@@ -1,0 +1,109 @@
+#include "host/channel_library.h"
+
+#include <filesystem>
+#include <utility>
+
+#if defined(_WIN32)
+#include <windows.h>
+#else
+#include <dlfcn.h>
+#endif
+
+namespace {
+
+#if defined(_WIN32)
+
+constexpr const char* kLibrarySuffix = ".dll";
+
+std::string LastSystemError() {
+  const DWORD code = GetLastError();
+  char* text = nullptr;
+  const DWORD length = FormatMessageA(
+      FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS,
+      nullptr, code, 0, reinterpret_cast<char*>(&text), 0, nullptr);
+  std::string message = length ? std::string(text, length) : "error " + std::to_string(code);
+  LocalFree(text);
+  while (!message.empty() && (message.back() == '\n' || message.back() == '\r')) {
+    message.pop_back();
+  }
+  return message;
+}
+
+void* OpenModule(const std::string& path, std::string& error) {
+  HMODULE module = LoadLibraryA(path.c_str());
+  if (!module) error = LastSystemError();
+  return module;
+}
+
+void* FindSymbol(void* module, const char* name) {
+  return reinterpret_cast<void*>(GetProcAddress(static_cast<HMODULE>(module), name));
+}
+
+void CloseModule(void* module) { FreeLibrary(static_cast<HMODULE>(module)); }
+
+#else
+
+constexpr const char* kLibrarySuffix = ".so";
+
+void* OpenModule(const std::string& path, std::string& error) {
+  void* module = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
+  if (!module) error = dlerror();
+  return module;
+}
+
+void* FindSymbol(void* module, const char* name) { return dlsym(module, name); }
+
+void CloseModule(void* module) { dlclose(module); }
+
+#endif
+
+template <typename Function>
+Function SymbolAs(void* module, const char* name) {
+  return reinterpret_cast<Function>(FindSymbol(module, name));
+}
+
+}  // namespace
+
+std::string ChannelLibraryFileName(const GUID& type) { return GuidToString(type) + kLibrarySuffix; }
+
+std::string ExecutableFolder() {
+#if defined(_WIN32)
+  char path[MAX_PATH];
+  const DWORD length = GetModuleFileNameA(nullptr, path, MAX_PATH);
+  return std::filesystem::path(std::string(path, length)).parent_path().string();
+#else
+  return std::filesystem::read_symlink("/proc/self/exe").parent_path().string();
+#endif
+}
+
+std::shared_ptr<ChannelLibrary> ChannelLibrary::Open(const std::string& folder, const GUID& type,
+                                                     std::string& error) {
+  const std::string path = (std::filesystem::path(folder) / ChannelLibraryFileName(type)).string();
+  std::string reason;
+  void* module = OpenModule(path, reason);
+  if (!module) {
+    error = "cannot load channel plug-in " + path + ": " + reason;
+    return nullptr;
+  }
+  const auto getType = SymbolAs<GetTypeFunction>(module, "GetType");
+  const auto initDll = SymbolAs<InitDllFunction>(module, "InitDLL");
+  if (!getType || !initDll) {
+    error = "channel plug-in " + path + " does not export " + (getType ? "InitDLL" : "GetType");
+    CloseModule(module);
+    return nullptr;
+  }
+  return std::shared_ptr<ChannelLibrary>(new ChannelLibrary(path, module, getType, initDll));
+}
+
+ChannelLibrary::ChannelLibrary(std::string path, void* module, GetTypeFunction getType,
+                               InitDllFunction initDll)
+    : path_(std::move(path)), module_(module), getType_(getType), initDll_(initDll) {}
+
+ChannelLibrary::~ChannelLibrary() { CloseModule(module_); }
+
+ChannelHandle ChannelLibrary::CreateChannel() const {
+  Vorn_Channel* channel = initDll_();
+  if (!channel) return ChannelHandle(nullptr, ChannelDeleter{});
+  channel->SetChannelType(Type());
+  return ChannelHandle(channel, ChannelDeleter{shared_from_this()});
+}

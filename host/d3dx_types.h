@@ -1,0 +1,26 @@
+// The platform's plain math and rectangle structures, as far as channels pass them around.
+#pragma once
+
+#include <cstdint>
+
+struct D3DXVECTOR3 {
+  float x;
+  float y;
+  float z;
+};
+
+// Four rows of four floats, first row first.
+struct D3DXMATRIX {
+  float m[4][4];
+};
+
+struct tagRECT {
+  std::int32_t left;
+  std::int32_t top;
+  std::int32_t right;
+  std::int32_t bottom;
+};
+
+static_assert(sizeof(D3DXVECTOR3) == 12);
+static_assert(sizeof(D3DXMATRIX) == 64);
+static_assert(sizeof(tagRECT) == 16);
