@@ -2,6 +2,10 @@
 // below it into one package text, or fills the tree back from one.
 #pragma once
 
+#include <initializer_list>
+#include <string_view>
+
+#include "host/d3dx_types.h"
 #include "host/export.h"
 #include "host/string_channel/string_channel.h"
 
@@ -24,14 +28,82 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   };
   static constexpr int kLinkCount = 6;
   static constexpr int kTextLength = 2048;  // every name and text field, NUL included
+  static constexpr int kMaxReadEntries = 9999;
+  static constexpr int kMaxTabs = 1023;
+  static constexpr int kMaxNesting = kMaxTabs;  // directories on one path of a walk
 
   Lum_DataPackage();
   Lum_DataPackage(const Lum_DataPackage& other);
   Lum_DataPackage& operator=(const Lum_DataPackage& other);
   ~Lum_DataPackage() override;
 
+  // Packs the tree into `buffer` and returns the size the whole package needs, its NUL included;
+  // a result above `size` means it did not fit. newlineChoice: true for "\n", false for "\r\n".
+  int WriteToBuffer(char* buffer, int size, bool newlineChoice, bool scramble);
+  // Fills the tree from the package in `buffer` and returns how far reading advanced.
+  int ReadFromBuffer(char* buffer, int size, bool newlineChoice, bool unscramble);
+  void WriteHeader();
+  int ReadWriteDirectory(bool unused);
+  static void Encrypt(char* data, int length);
+  static void Decrypt(char* data, int length);
+
  private:
   friend class DataPackageTestAccess;
 
+  // Package buffer and cursor.
+  static void SetBuffer(char* buffer, unsigned int size);
+  static void EndTextAtNul();
+  static int BufferAppend(int length);
+  static void AppendPieces(std::initializer_list<std::string_view> pieces);
+  static const char* GetTabs();
+  static const char* GetNewline();
+
+  // Scanning.
+  static const char* Find(std::string_view pattern);
+  static void MoveCursorAfter(const char* pattern);
+  static char* GetStringBefore(const char* delimiter);
+  static void CutStringBefore(std::string_view delimiter, char* text);
+  static bool IsWhiteSpace(char c);
+  static bool MoveCursorBeforeTag(const char* name);
+  static int GetItemType(const char* name);
+
+  // Element tags.
+  static bool XML_OpeningTag(const char* name);
+  static bool XML_OpeningIDTag(const char* name, int id);
+  static void XML_ClosingTag(const char* name);
+  static void XML_StringTag(const char* name, char* text);
+  static void XML_ValueTag(const char* name, float& value);
+  static void XML_VectorTag(const char* name, D3DXVECTOR3& vector);
+  static void XML_MatrixTag(const char* name, D3DXMATRIX& matrix);
+  static void WriteTypedElement(const char* name, std::string_view type, std::string_view value);
+  static bool ReadTypedElementName(const char* name);
+
+  // Directory walk.
+  void TakeTagName();
+  bool OpenEntry(int index, int entryCount);
+  void ReadWriteData();
+  void ReadWriteSubDirectories();
+  bool IsBeingWalked() const;
+
   char tagName[kTextLength] = {};
+
+  // One package operation at a time, shared by every DataDirectory in the process.
+  static char* bufferStart;
+  static const char* bufferEnd;
+  static const char* textEnd;  // reading: bufferEnd, or the first NUL before it
+  static int bufferCursor;     // distance from bufferStart; while writing it may pass bufferEnd
+  static int requiredSize;
+  static int treeDepth;
+  static bool write;
+  static bool fileNoTxtChan;
+  static bool busy;
+  static char tmp[kTextLength];
+  static char tmp2[kTextLength];
+  static char strg[kTextLength];
+  static char strg2[kTextLength];
+  static char tabsBuffer[kMaxTabs + 1];
+  static char newlineBuffer[3];
+  static char stringBeforeBuffer[kTextLength];
+  static const Lum_DataPackage* walkPath[kMaxNesting];
+  static int walkDepth;
 };

@@ -1,0 +1,77 @@
+// The shared buffer and cursor, and the appends that write a package into it.
+#include <algorithm>
+#include <climits>
+#include <cstring>
+
+#include "plugin/data_package.h"
+
+char* Lum_DataPackage::bufferStart = nullptr;
+const char* Lum_DataPackage::bufferEnd = nullptr;
+const char* Lum_DataPackage::textEnd = nullptr;
+int Lum_DataPackage::bufferCursor = 0;
+int Lum_DataPackage::requiredSize = 0;
+int Lum_DataPackage::treeDepth = 0;
+bool Lum_DataPackage::write = true;
+bool Lum_DataPackage::fileNoTxtChan = true;
+bool Lum_DataPackage::busy = false;
+char Lum_DataPackage::tmp[kTextLength] = {};
+char Lum_DataPackage::tmp2[kTextLength] = {};
+char Lum_DataPackage::strg[kTextLength] = {};
+char Lum_DataPackage::strg2[kTextLength] = {};
+char Lum_DataPackage::tabsBuffer[kMaxTabs + 1] = {};
+char Lum_DataPackage::newlineBuffer[3] = {};
+char Lum_DataPackage::stringBeforeBuffer[kTextLength] = {};
+const Lum_DataPackage* Lum_DataPackage::walkPath[kMaxNesting] = {};
+int Lum_DataPackage::walkDepth = 0;
+
+void Lum_DataPackage::SetBuffer(char* buffer, unsigned int size) {
+  bufferStart = buffer;
+  bufferEnd = buffer + size;
+  textEnd = bufferEnd;
+  bufferCursor = 0;
+}
+
+// Reading stops at the first NUL, and never looks past bufferEnd for one.
+void Lum_DataPackage::EndTextAtNul() {
+  const auto size = static_cast<std::size_t>(bufferEnd - bufferStart);
+  if (const void* nul = size ? std::memchr(bufferStart, '\0', size) : nullptr) {
+    textEnd = static_cast<const char*>(nul);
+  }
+}
+
+int Lum_DataPackage::BufferAppend(int length) {
+  // Longer lengths would read past tmp; they come only from a failed formatting, as negatives do.
+  if (length < 0 || length >= kTextLength) return 0;
+  AppendPieces({std::string_view(tmp, length)});
+  return length;
+}
+
+// Pieces are appended as one: copied whole with a NUL after them when they fit together with
+// that NUL, otherwise not at all. Either way they are counted, so that a first pass into a small
+// buffer measures the package. Counts stop at INT_MAX, which no buffer of an int size reaches.
+void Lum_DataPackage::AppendPieces(std::initializer_list<std::string_view> pieces) {
+  long long length = 0;
+  for (std::string_view piece : pieces)
+    length += static_cast<long long>(piece.size());
+  const long long end = bufferCursor + length;
+  if (end < bufferEnd - bufferStart) {
+    char* out = bufferStart + bufferCursor;
+    for (std::string_view piece : pieces)
+      out = std::copy(piece.begin(), piece.end(), out);
+    *out = '\0';
+  }
+  bufferCursor = static_cast<int>(std::min<long long>(end, INT_MAX - 1));
+  requiredSize = static_cast<int>(std::min<long long>(requiredSize + length, INT_MAX));
+}
+
+const char* Lum_DataPackage::GetTabs() {
+  const int tabs = std::clamp(treeDepth, 0, kMaxTabs);
+  std::memset(tabsBuffer, '\t', tabs);
+  tabsBuffer[tabs] = '\0';
+  return tabsBuffer;
+}
+
+const char* Lum_DataPackage::GetNewline() {
+  std::strcpy(newlineBuffer, fileNoTxtChan ? "\n" : "\r\n");
+  return newlineBuffer;
+}

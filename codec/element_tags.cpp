@@ -1,0 +1,150 @@
+// The tags of a directory entry and the typed data elements, each serving both directions: one
+// walk writes them and reads them back with the same calls.
+#include <cstring>
+
+#include "codec/number_format.h"
+#include "codec/number_scan.h"
+#include "plugin/data_package.h"
+
+namespace {
+
+constexpr std::string_view kVectorFormat = "%f %f %f";
+constexpr std::string_view kMatrixFormat = "%f %f %f %f, %f %f %f %f, %f %f %f %f, %f %f %f %f";
+
+// Formats floats as the scan formats above read them back: a space between numbers, a comma
+// before the space that starts a new row of four.
+std::string_view FormatFloats(const float* values, int count, char* out) {
+  char* end = out;
+  for (int i = 0; i < count; ++i) {
+    if (i > 0) {
+      if (i % 4 == 0 && count == 16) *end++ = ',';
+      *end++ = ' ';
+    }
+    end += numbers::FormatFloat(values[i], end);
+  }
+  return std::string_view(out, static_cast<std::size_t>(end - out));
+}
+
+}  // namespace
+
+bool Lum_DataPackage::XML_OpeningTag(const char* name) {
+  if (write) {
+    AppendPieces({GetNewline(), GetTabs(), "<", name, ">"});
+  } else {
+    do {
+      MoveCursorAfter("<");
+      CutStringBefore(">", tmp2);
+      MoveCursorAfter(">");
+    } while (tmp2[0] != '\0' && std::strncmp(tmp2, name, std::strlen(name)) != 0);
+  }
+  ++treeDepth;
+  return true;
+}
+
+bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
+  if (write) {
+    char number[12];
+    const std::string_view idText(number, numbers::FormatInt(id, number));
+    AppendPieces({GetNewline(), GetTabs(), "<", name, " id=\"", idText, "\">"});
+    ++treeDepth;
+    return true;
+  }
+  const int start = bufferCursor;
+  const std::size_t nameLength = std::strlen(name);
+  do {
+    MoveCursorAfter("<");
+    CutStringBefore(">", tmp2);
+    MoveCursorAfter(">");
+    if (std::strlen(tmp2) > nameLength) tmp2[nameLength] = '\0';
+  } while (id == 0 && tmp2[0] != '\0' && std::strcmp(tmp2, name) != 0);
+  if (std::strcmp(tmp2, name) != 0) {
+    bufferCursor = start;
+    return false;
+  }
+  ++treeDepth;
+  return true;
+}
+
+void Lum_DataPackage::XML_ClosingTag(const char* name) {
+  --treeDepth;
+  if (write) {
+    AppendPieces({GetNewline(), GetTabs(), "</", name, ">"});
+    return;
+  }
+  do {
+    MoveCursorAfter("</");
+    CutStringBefore(">", tmp2);
+    MoveCursorAfter(">");
+  } while (tmp2[0] != '\0' && std::strcmp(tmp2, name) != 0);
+}
+
+void Lum_DataPackage::WriteTypedElement(const char* name, std::string_view type,
+                                        std::string_view value) {
+  AppendPieces(
+      {GetNewline(), GetTabs(), "<", name, " Type=\"", type, "\"> ", value, " </", name, ">"});
+}
+
+// Reading: takes the element at the next "<" when its name is `name`, leaving the cursor just
+// after its opening tag; otherwise puts the cursor back and reports false.
+bool Lum_DataPackage::ReadTypedElementName(const char* name) {
+  const int start = bufferCursor;
+  MoveCursorAfter("<");
+  CutStringBefore("Type=", tmp2);
+  MoveCursorAfter(">");
+  if (std::strcmp(tmp2, name) == 0) return true;
+  bufferCursor = start;
+  return false;
+}
+
+void Lum_DataPackage::XML_StringTag(const char* name, char* text) {
+  if (write) {
+    WriteTypedElement(name, "Txt", text);
+  } else if (ReadTypedElementName(name)) {
+    CutStringBefore("</", text);
+    MoveCursorAfter(">");
+  } else {
+    text[0] = '\0';
+  }
+}
+
+void Lum_DataPackage::XML_ValueTag(const char* name, float& value) {
+  if (write) {
+    WriteTypedElement(name, "Val", FormatFloats(&value, 1, tmp2));
+  } else if (ReadTypedElementName(name)) {
+    numbers::ScanFloat(bufferStart + bufferCursor, textEnd, value);
+    MoveCursorAfter(">");
+  } else {
+    value = 0.0f;
+  }
+}
+
+void Lum_DataPackage::XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
+  float values[3] = {vector.x, vector.y, vector.z};
+  if (write) {
+    WriteTypedElement(name, "Vec", FormatFloats(values, 3, tmp2));
+    return;
+  }
+  if (ReadTypedElementName(name)) {
+    numbers::ScanFloats(bufferStart + bufferCursor, textEnd, kVectorFormat, values);
+    MoveCursorAfter(">");
+  } else {
+    values[0] = values[1] = values[2] = 0.0f;
+  }
+  vector = {values[0], values[1], values[2]};
+}
+
+void Lum_DataPackage::XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
+  float values[16];
+  std::memcpy(values, &matrix, sizeof(values));
+  if (write) {
+    WriteTypedElement(name, "Mat", FormatFloats(values, 16, tmp2));
+    return;
+  }
+  if (ReadTypedElementName(name)) {
+    numbers::ScanFloats(bufferStart + bufferCursor, textEnd, kMatrixFormat, values);
+    MoveCursorAfter(">");
+  } else {
+    std::memset(values, 0, sizeof(values));
+  }
+  std::memcpy(&matrix, values, sizeof(values));
+}
