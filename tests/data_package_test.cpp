@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "host/engine_trace.h"
+#include "tests/data_package_access.h"
 #include "tests/plugins.h"
 
 namespace {

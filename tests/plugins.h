@@ -1,5 +1,4 @@
-// The two channel plug-ins, loaded once per test program from the folder it runs in, and the
-// test-only view into a DataDirectory's private parts.
+// The two channel plug-ins, loaded once per test program from the folder it runs in.
 #pragma once
 
 #include <memory>
@@ -22,8 +21,3 @@ struct Directory {
 Directory NewDirectory();
 
 }  // namespace plugins
-
-class DataPackageTestAccess {
- public:
-  static char* TagName(Lum_DataPackage& directory) { return directory.tagName; }
-};
