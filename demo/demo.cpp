@@ -1,49 +1,136 @@
-// Loads the DataDirectory plug-in as the engine does and shows what it declares.
+// The package demo: an engine-side host loads the DataDirectory plug-in by its GUID file name,
+// packs a small tree, scrambles the package and reads it back into a second tree.
 #include <cstdio>
 #include <string>
+#include <vector>
 
+#include "host/callback_channel.h"
 #include "host/channel_library.h"
-#include "host/guid.h"
+#include "host/value_channel.h"
+#include "plugin/data_package.h"
 
 namespace {
 
-void PrintTypeRecord(const ChannelType& type) {
-  std::printf("Type record\n");
-  std::printf("  %-10s %s\n", "name", type.typeName);
-  std::printf("  %-10s %s\n", "GUID", GuidToString(type.typeGuid).c_str());
-  std::printf("  %-10s %s\n", "base GUID", GuidToString(type.baseTypeGuid).c_str());
-  std::printf("  %-10s %d\n", "type code", static_cast<int>(type.typeCode));
+using Link = Lum_DataPackage::Link;
+
+struct PlayerEntry {
+  std::string name;
+  float score;
+};
+
+// The engine side of one Players directory: the channels on its links, owned here.
+class PlayersTree {
+ public:
+  PlayersTree(const ChannelLibrary& directories, const ChannelLibrary& texts)
+      : directory_(directories.CreateChannel()),
+        tag_(texts.CreateChannel()),
+        name_(texts.CreateChannel()) {
+    tag().SetString("Players");
+    name_->SetChannelName("Name");
+    score_.SetChannelName("Score");
+    Directory().AttachChild(Link::kTagLink, tag_.get());
+    Directory().AttachChild(Link::kCountLink, &count_);
+    Directory().AttachChild(Link::kCurrentIndexLink, &index_);
+    Directory().AttachChild(Link::kDataLink, name_.get());
+    Directory().AttachChild(Link::kDataLink, &score_);
+    Directory().AttachChild(Link::kCallEachIterationLink, &callEachIteration_);
+  }
+
+  Lum_DataPackage& Directory() { return *static_cast<Lum_DataPackage*>(directory_.get()); }
+
+  // Writing: the channel fills entry i from "currrent index" before it is packed.
+  void Supply(const std::vector<PlayerEntry>& entries) {
+    count_.SetValue(static_cast<float>(entries.size()));
+    callEachIteration_.SetCallback([this, &entries] {
+      const PlayerEntry& entry = entries[static_cast<std::size_t>(index_.GetValue())];
+      text(*name_).SetString(entry.name.c_str());
+      score_.SetValue(entry.score);
+    });
+  }
+
+  // Reading: the channel takes each entry once it has been read.
+  void Collect(std::vector<PlayerEntry>& entries) {
+    callEachIteration_.SetCallback([this, &entries] {
+      entries.push_back({text(*name_).GetString(), score_.GetValue()});
+    });
+  }
+
+  float Count() { return count_.GetValue(); }
+
+ private:
+  static Lum_StringChannel& text(Vorn_Channel& channel) {
+    return static_cast<Lum_StringChannel&>(channel);
+  }
+  Lum_StringChannel& tag() { return text(*tag_); }
+
+  ChannelHandle directory_;
+  ChannelHandle tag_;
+  ChannelHandle name_;
+  Lum_ValueChannel count_;
+  Lum_ValueChannel index_;
+  Lum_ValueChannel score_;
+  Lum_CallbackChannel callEachIteration_;
+};
+
+std::shared_ptr<ChannelLibrary> Load(const GUID& type) {
+  std::string error;
+  auto library = ChannelLibrary::Open(ExecutableFolder(), type, error);
+  if (!library) std::fprintf(stderr, "datadirectory_demo: %s\n", error.c_str());
+  return library;
 }
 
-void PrintLinks(const Vorn_Channel& channel) {
-  std::printf("\nLinks of a new \"%s\" channel (declared count %d)\n", channel.GetChannelName(),
-              channel.GetChildCreationCount());
-  std::printf("  %-4s %-20s %-20s %-36s %5s %5s\n", "link", "name", "takes", "type GUID", "code",
-              "mode");
-  for (int link = 0; const ChildCreation* record = channel.GetChildCreateType(link); ++link) {
-    std::printf("  %-4d %-20s %-20s %-36s %5d %5d\n", link, record->linkName,
-                record->childType.typeName, GuidToString(record->childType.typeGuid).c_str(),
-                static_cast<int>(record->linkCode), static_cast<int>(record->linkMode));
+void PrintText(const std::string& text) {
+  std::size_t start = 0;
+  for (;;) {
+    const std::size_t end = text.find('\n', start);
+    std::printf("  | %s\n", text.substr(start, end - start).c_str());
+    if (end == std::string::npos) break;
+    start = end + 1;
   }
+}
+
+void PrintBytes(const std::vector<char>& bytes, std::size_t count) {
+  std::printf("  |");
+  for (std::size_t i = 0; i < count && i < bytes.size(); ++i) {
+    std::printf(" %02x", static_cast<unsigned char>(bytes[i]));
+  }
+  std::printf(" ...\n");
 }
 
 }  // namespace
 
 int main() {
-  std::string error;
-  const auto library = ChannelLibrary::Open(ExecutableFolder(), kDataDirectoryGuid, error);
-  if (!library) {
-    std::fprintf(stderr, "datadirectory_demo: %s\n", error.c_str());
-    return 1;
-  }
-  std::printf("Loaded %s\n\n", library->Path().c_str());
-  PrintTypeRecord(library->Type());
+  const auto directories = Load(kDataDirectoryGuid);
+  const auto texts = Load(kStringChannelGuid);
+  if (!directories || !texts) return 1;
+  const ChannelType& type = directories->Type();
+  std::printf("Plug-in     %s\n", directories->Path().c_str());
+  std::printf("Type        %s, %s, code %d\n\n", type.typeName, GuidToString(type.typeGuid).c_str(),
+              static_cast<int>(type.typeCode));
 
-  const ChannelHandle directory = library->CreateChannel();
-  if (!directory) {
-    std::fprintf(stderr, "datadirectory_demo: the plug-in could not create a channel\n");
-    return 1;
+  const std::vector<PlayerEntry> players = {{"Ann", 12.5f}, {"Bob", 7.0f}};
+  PlayersTree writer(*directories, *texts);
+  writer.Supply(players);
+  const int size = writer.Directory().WriteToBuffer(nullptr, 0, true, false);
+  std::vector<char> package(static_cast<std::size_t>(size));
+  writer.Directory().WriteToBuffer(package.data(), size, true, false);
+  std::printf("Package     %d bytes with its NUL, LF line breaks, empty header:\n", size);
+  PrintText(package.data());
+
+  writer.Directory().WriteToBuffer(package.data(), size, true, true);
+  std::printf("\nScrambled   the same %d bytes, the first 24:\n", size);
+  PrintBytes(package, 24);
+
+  std::vector<PlayerEntry> received;
+  PlayersTree reader(*directories, *texts);
+  reader.Collect(received);
+  const int advanced = reader.Directory().ReadFromBuffer(package.data(), size, true, true);
+  std::printf("\nRead back   %d bytes unscrambled and read, Count now %g\n", advanced,
+              static_cast<double>(reader.Count()));
+  std::printf("  %-6s %-8s %s\n", "entry", "Name", "Score");
+  for (std::size_t i = 0; i < received.size(); ++i) {
+    std::printf("  %-6zu %-8s %g\n", i, received[i].name.c_str(),
+                static_cast<double>(received[i].score));
   }
-  PrintLinks(*directory);
   return 0;
 }
