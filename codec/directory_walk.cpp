@@ -1,6 +1,7 @@
 // The recursive walk over a directory tree. One routine serves both directions, so that reading
 // visits the same channels in the same order, with the same element calls, as writing.
 #include <algorithm>
+#include <climits>
 #include <cmath>
 #include <cstring>
 
@@ -34,6 +35,10 @@ const char* NameIn(char (&field)[Lum_DataPackage::kTextLength], const char* name
 
 }  // namespace
 
+// Once the size no int can count is reached, no buffer can take the package and nothing further
+// changes the result: more entries would only keep the engine waiting.
+bool Lum_DataPackage::PackageTooLarge() { return write && requiredSize == INT_MAX; }
+
 int Lum_DataPackage::ReadWriteDirectory(bool) {
   // A directory already on the walk's path would be walked without end.
   if (walkDepth >= kMaxNesting || IsBeingWalked()) return bufferCursor;
@@ -50,7 +55,7 @@ int Lum_DataPackage::ReadWriteDirectory(bool) {
     XML_ClosingTag(tagName);
   }
   int index = 0;
-  for (; index < entryCount; ++index) {
+  for (; index < entryCount && !PackageTooLarge(); ++index) {
     if (currentIndex) AsValue(currentIndex)->SetValue(static_cast<float>(index));
     if (write && callEachIteration) callEachIteration->CallChannel();
     if (!OpenEntry(index, entryCount)) break;

@@ -84,6 +84,7 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   void ReadWriteData();
   void ReadWriteSubDirectories();
   bool IsBeingWalked() const;
+  static bool PackageTooLarge();
 
   char tagName[kTextLength] = {};
 

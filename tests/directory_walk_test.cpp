@@ -81,16 +81,52 @@ TEST(DirectoryWalkTest, ChildrenShapeTheElement) {
   EXPECT_EQ(WritePackage(*nested), "\n<N>\n\t<Header Type=\"Txt\"> h </Header>\n</N>");
 }
 
-TEST(DirectoryWalkTest, TagWithoutStringCountsAsNoTag) {
+TEST(DirectoryWalkTest, MissingStringsReadAsEmpty) {
   struct NullText : Lum_StringChannel {
     const char* GetString() override { return nullptr; }
   };
+  struct NullHeader : Lum_DataPackage {
+    const char* GetString() override { return nullptr; }
+  };
   TestTree tree;
-  Lum_DataPackage* directory = tree.Directory();
+  auto* directory = tree.Make<NullHeader>();
   tree.Attach(directory, Link::kTagLink, tree.Make<NullText>());
   auto* text = tree.Attach(directory, Link::kDataLink, tree.Make<NullText>());
   text->SetChannelName("T");
   EXPECT_EQ(WritePackage(*directory), "\n<Noname>\n\t<T Type=\"Txt\">  </T>\n</Noname>");
+}
+
+TEST(DirectoryWalkTest, OverlongNamesAndTextsAreWrittenWholeButNotReadBack) {
+  TestTree tree;
+  Lum_DataPackage* directory = tree.Directory("D");
+  const std::string fits(2047, 'f');
+  const std::string tooLong(2048, 'x');
+  Lum_StringChannel* fitting = tree.Text(directory, fits.c_str(), fits.c_str());
+  Lum_StringChannel* longText = tree.Text(directory, "Long", tooLong.c_str());
+  Lum_ValueChannel* longName = tree.Value(directory, tooLong.c_str(), 5);
+  Lum_ValueChannel* after = tree.Value(directory, "After", 6);
+  const std::string package = WritePackage(*directory);
+  EXPECT_NE(package.find("> " + tooLong + " </Long>"), std::string::npos);
+  EXPECT_NE(package.find("<" + tooLong + " Type=\"Val\"> 5 </" + tooLong + ">"), std::string::npos);
+
+  fitting->SetString("");
+  after->SetValue(0);
+  ReadPackage(*directory, package);
+  EXPECT_EQ(fitting->GetString(), fits);
+  EXPECT_STREQ(longText->GetString(), "");
+  EXPECT_EQ(longName->GetValue(), 0.0f);
+  EXPECT_EQ(after->GetValue(), 0.0f);  // the unread element stands in its way
+}
+
+TEST(DirectoryWalkTest, CountsBeyondAnyBufferStopOnceTheSizeSaturates) {
+  TestTree tree;
+  Lum_DataPackage* directory = tree.Directory("D");
+  tree.Count(directory, std::numeric_limits<float>::infinity());
+  Lum_ValueChannel* index = tree.CurrentIndex(directory);
+  const std::string megabyte(1 << 20, 'm');
+  tree.Text(directory, "T", megabyte.c_str());
+  EXPECT_EQ(directory->WriteToBuffer(nullptr, 0, true, false), 2147483647);
+  EXPECT_EQ(index->GetValue(), 2047.0f);
 }
 
 TEST(DirectoryWalkTest, SubDirectoriesRepeatInsideEveryEntry) {
@@ -215,6 +251,34 @@ TEST(DirectoryWalkTest, ReadingFillsEntriesAndCountsThem) {
     EXPECT_EQ(count->GetValue(), static_cast<float>(c.entries.size())) << c.package;
     EXPECT_EQ(index->GetValue(), static_cast<float>(c.entries.size())) << c.package;
   }
+}
+
+TEST(DirectoryWalkTest, ReadingLooksAtWhatEndsAnEntryAndStartsEachEntryAfresh) {
+  TestTree tree;
+  Lum_DataPackage* directory = tree.Directory("Sub");
+  Lum_ValueChannel* count = tree.Count(directory, 0);
+  Lum_ValueChannel* subtotal = tree.Value(directory, "xSubtotal");
+  Lum_VectorChannel* vector = tree.Vector(directory, "P");
+  Lum_MatrixChannel* matrix = tree.Matrix(directory, "M");
+  std::vector<D3DXVECTOR3> vectors;
+  std::vector<D3DXMATRIX> matrices;
+  tree.CallEachIteration(directory, [&] {
+    vectors.push_back(vector->GetVector());
+    matrices.push_back(matrix->GetMatrix());
+  });
+  ReadPackage(*directory,
+              "<Sub id=\"0\"><xSubtotal Type=\"Val\"> 3 </xSubtotal>"
+              "<P Type=\"Vec\"> 1 2 3 </P><M Type=\"Mat\"> 1 2 3 4, 5 6 7 8, 9 8 7 6, 5 4 3 2 </M>"
+              "</Sub><Sub id=\"1\"><P Type=\"Vec\"> 4 </P><M Type=\"Mat\"> 9 </M></Sub>");
+  // A first element whose name holds the directory's name is data, not the end of the entry.
+  EXPECT_EQ(count->GetValue(), 2.0f);
+  EXPECT_EQ(subtotal->GetValue(), 0.0f);  // the second entry has none
+  ASSERT_EQ(vectors.size(), 2u);
+  // What an element leaves unread is zero, not what the entry before held.
+  EXPECT_EQ(vectors[1], (D3DXVECTOR3{4, 0, 0}));
+  D3DXMATRIX nine{};
+  nine.m[0][0] = 9;
+  EXPECT_EQ(matrices[1], nine);
 }
 
 TEST(DirectoryWalkTest, ReadingStopsAt9999Entries) {

@@ -2,9 +2,7 @@
 
 #include <gtest/gtest.h>
 
-#include <cstring>
-#include <memory>
-
+#include "tests/guarded_buffer.h"
 #include "tests/plugins.h"
 
 void TestTree::ReportRefusal(int link) { ADD_FAILURE() << "attaching to link " << link; }
@@ -71,10 +69,8 @@ std::string WritePackage(Lum_DataPackage& directory, bool lineFeeds, bool scramb
 }
 
 int ReadPackage(Lum_DataPackage& directory, const std::string& package, bool unscramble) {
-  // An allocation of exactly the package's bytes: a read past them is a fault the tools catch.
-  const auto buffer = std::make_unique<char[]>(package.size());
-  std::memcpy(buffer.get(), package.data(), package.size());
-  return directory.ReadFromBuffer(buffer.get(), static_cast<int>(package.size()), true, unscramble);
+  const GuardedBuffer buffer(package);
+  return directory.ReadFromBuffer(buffer.data(), buffer.size(), true, unscramble);
 }
 
 D3DXMATRIX MatrixOf(float first, float step) {

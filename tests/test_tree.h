@@ -54,7 +54,8 @@ class TestTree {
 // the text without its NUL.
 std::string WritePackage(Lum_DataPackage& directory, bool lineFeeds = true, bool scramble = false);
 
-// Reads `package` from a buffer of exactly its bytes (no NUL after them); returns the result.
+// Reads `package` from a buffer of exactly its bytes, with no NUL and no readable byte after
+// them; returns the result.
 int ReadPackage(Lum_DataPackage& directory, const std::string& package, bool unscramble = false);
 
 D3DXMATRIX MatrixOf(float first, float step);
