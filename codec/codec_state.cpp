@@ -23,12 +23,17 @@ char Lum_DataPackage::newlineBuffer[3] = {};
 char Lum_DataPackage::stringBeforeBuffer[kTextLength] = {};
 const Lum_DataPackage* Lum_DataPackage::walkPath[kMaxNesting] = {};
 int Lum_DataPackage::walkDepth = 0;
+Lum_DataPackage::DelimiterMemo Lum_DataPackage::delimiterMemo[4] = {
+    {"<", 0, -1}, {">", 0, -1}, {"</", 0, -1}, {"Type=", 0, -1}};
+Lum_DataPackage::TagSearchMemo Lum_DataPackage::tagSearchMemo[kTagSearchMemos] = {};
+unsigned int Lum_DataPackage::readSerial = 0;
 
 void Lum_DataPackage::SetBuffer(char* buffer, unsigned int size) {
   bufferStart = buffer;
   bufferEnd = buffer + size;
   textEnd = bufferEnd;
   bufferCursor = 0;
+  ForgetSearches();
 }
 
 // Reading stops at the first NUL, and never looks past bufferEnd for one.
@@ -37,6 +42,7 @@ void Lum_DataPackage::EndTextAtNul() {
   if (const void* nul = size ? std::memchr(bufferStart, '\0', size) : nullptr) {
     textEnd = static_cast<const char*>(nul);
   }
+  ForgetSearches();
 }
 
 int Lum_DataPackage::BufferAppend(int length) {

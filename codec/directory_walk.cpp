@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <climits>
 #include <cmath>
+#include <cstdint>
 #include <cstring>
 
 #include "host/matrix_channel.h"
@@ -78,8 +79,29 @@ void Lum_DataPackage::TakeTagName() {
   if (!name) name = kNoName;
   const std::size_t length =
       static_cast<std::size_t>(std::find(name, name + kTextLength - 1, '\0') - name);
+  // What the read learnt about searching for the old name says nothing about the new one.
+  if (std::strncmp(tagName, name, length) != 0 || tagName[length] != '\0') ForgetTagSearch();
   std::memcpy(tagName, name, length);
   tagName[length] = '\0';
+}
+
+// This directory's place in the memo of tag searches. Directories that share a place only cost
+// each other what they learnt.
+Lum_DataPackage::TagSearchMemo& Lum_DataPackage::TagSearchMemoSlot() const {
+  const auto address = static_cast<std::uint64_t>(reinterpret_cast<std::uintptr_t>(this));
+  return tagSearchMemo[(address * 0x9E3779B97F4A7C15u) >> 56];
+}
+
+// Where this directory's tag search is known to fail during the current read.
+int& Lum_DataPackage::TagSearchFailsFrom() {
+  TagSearchMemo& memo = TagSearchMemoSlot();
+  if (memo.directory != this || memo.read != readSerial) memo = {this, readSerial, INT_MAX};
+  return memo.failsFrom;
+}
+
+void Lum_DataPackage::ForgetTagSearch() {
+  TagSearchMemo& memo = TagSearchMemoSlot();
+  if (memo.directory == this) memo.directory = nullptr;
 }
 
 bool Lum_DataPackage::OpenEntry(int index, int entryCount) {
@@ -87,7 +109,7 @@ bool Lum_DataPackage::OpenEntry(int index, int entryCount) {
     return entryCount == 1 ? XML_OpeningTag(tagName) : XML_OpeningIDTag(tagName, index);
   }
   if (index > 0) return GetItemType(tagName) == 2 && XML_OpeningIDTag(tagName, index);
-  if (!MoveCursorBeforeTag(tagName)) return false;
+  if (!SearchTag(tagName, TagSearchFailsFrom())) return false;
   switch (GetItemType(tagName)) {
     case 1:
       return XML_OpeningTag(tagName);

@@ -1,6 +1,7 @@
 // The reader's vocabulary: forward searches from the cursor over the text being read, which ends
 // at bufferEnd or at a NUL before it. Nothing here looks at a byte outside that text.
 #include <algorithm>
+#include <climits>
 #include <cstring>
 
 #include "plugin/data_package.h"
@@ -15,12 +16,30 @@ bool StartsWith(std::string_view text, const char* prefix) {
 
 }  // namespace
 
-// The first occurrence at or after the cursor that lies wholly inside the text.
+// The first occurrence at or after the cursor that lies wholly inside the text. Readers search
+// for the same few delimiters from cursors that mostly move forward; remembering the last answer
+// for each keeps a missing or far delimiter from being searched for over and over.
 const char* Lum_DataPackage::Find(std::string_view pattern) {
+  DelimiterMemo* memo = nullptr;
+  for (DelimiterMemo& candidate : delimiterMemo) {
+    if (candidate.delimiter == pattern) memo = &candidate;
+  }
+  if (memo && memo->from <= bufferCursor && (memo->found < 0 || bufferCursor <= memo->found)) {
+    return memo->found < 0 ? nullptr : bufferStart + memo->found;
+  }
   const char* from = bufferStart + bufferCursor;
   const std::string_view rest(from, static_cast<std::size_t>(textEnd - from));
   const std::size_t at = rest.find(pattern);
-  return at == std::string_view::npos ? nullptr : from + at;
+  const char* found = at == std::string_view::npos ? nullptr : from + at;
+  if (memo) *memo = {pattern, bufferCursor, found ? static_cast<int>(found - bufferStart) : -1};
+  return found;
+}
+
+// A new text, or a new end to it, makes everything learnt about the old one wrong.
+void Lum_DataPackage::ForgetSearches() {
+  for (DelimiterMemo& memo : delimiterMemo)
+    memo.from = INT_MAX;
+  ++readSerial;
 }
 
 void Lum_DataPackage::MoveCursorAfter(const char* pattern) {
@@ -59,15 +78,31 @@ bool Lum_DataPackage::IsWhiteSpace(char c) {
 }
 
 bool Lum_DataPackage::MoveCursorBeforeTag(const char* name) {
+  int unknown = INT_MAX;
+  return SearchTag(name, unknown);
+}
+
+// Searches as MoveCursorBeforeTag does, knowing that no tag from `failsFrom` on matches; on
+// failure it lowers `failsFrom` to what it has learnt.
+//
+// Whatever "<" a search starts at, its second tag is one that a search from the text's start
+// visits too: a "<" inside the content of a tag on that chain cuts out up to the same ">" and goes
+// on from the same place. So every tag from a failed search's second on fails for any search.
+bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
   const int start = bufferCursor;
-  for (;;) {
+  int secondTag = -1;
+  for (bool first = true;; first = false) {
     const int before = bufferCursor;
     MoveCursorAfter("<");
-    if (bufferCursor == before || bufferStart + bufferCursor >= textEnd) {
+    const int tag = bufferCursor - 1;
+    if (bufferCursor == before || bufferStart + bufferCursor >= textEnd ||
+        (!first && tag >= failsFrom)) {
+      failsFrom =
+          std::min(failsFrom, secondTag >= 0 ? secondTag : static_cast<int>(textEnd - bufferStart));
       bufferCursor = start;
       return false;
     }
-    const int tag = bufferCursor - 1;
+    if (!first && secondTag < 0) secondTag = tag;
     CutStringBefore(">", tmp2);
     bool found = std::strcmp(tmp2, name) == 0;
     if (!found) {

@@ -60,11 +60,13 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
 
   // Scanning.
   static const char* Find(std::string_view pattern);
+  static void ForgetSearches();
   static void MoveCursorAfter(const char* pattern);
   static char* GetStringBefore(const char* delimiter);
   static void CutStringBefore(std::string_view delimiter, char* text);
   static bool IsWhiteSpace(char c);
   static bool MoveCursorBeforeTag(const char* name);
+  static bool SearchTag(const char* name, int& failsFrom);
   static int GetItemType(const char* name);
 
   // Element tags.
@@ -84,6 +86,10 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   void ReadWriteData();
   void ReadWriteSubDirectories();
   bool IsBeingWalked() const;
+  struct TagSearchMemo;
+  TagSearchMemo& TagSearchMemoSlot() const;
+  int& TagSearchFailsFrom();
+  void ForgetTagSearch();
   static bool PackageTooLarge();
 
   char tagName[kTextLength] = {};
@@ -107,4 +113,21 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   static char stringBeforeBuffer[kTextLength];
   static const Lum_DataPackage* walkPath[kMaxNesting];
   static int walkDepth;
+
+  // What one read has learnt about its text, so that no search runs over the same stretch again
+  // and again: where each delimiter next occurs, and where each directory's tag search fails.
+  struct DelimiterMemo {
+    std::string_view delimiter;
+    int from;   // the memo answers searches starting from here...
+    int found;  // ...up to here, with this occurrence; -1: none from `from` on
+  };
+  struct TagSearchMemo {
+    const Lum_DataPackage* directory;
+    unsigned int read;
+    int failsFrom;
+  };
+  static constexpr int kTagSearchMemos = 256;  // indexed by the top 8 bits of a hash
+  static DelimiterMemo delimiterMemo[4];
+  static TagSearchMemo tagSearchMemo[kTagSearchMemos];
+  static unsigned int readSerial;
 };

@@ -47,6 +47,9 @@ class DataPackageTestAccess {
   static bool IsWhiteSpace(char c) { return Package::IsWhiteSpace(c); }
   static bool MoveCursorBeforeTag(const char* name) { return Package::MoveCursorBeforeTag(name); }
   static int GetItemType(const char* name) { return Package::GetItemType(name); }
+  static bool SearchTag(const char* name, int& failsFrom) {
+    return Package::SearchTag(name, failsFrom);
+  }
 
   static bool XML_OpeningTag(const char* name) { return Package::XML_OpeningTag(name); }
   static bool XML_OpeningIDTag(const char* name, int id) {

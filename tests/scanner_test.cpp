@@ -1,5 +1,7 @@
 #include <gtest/gtest.h>
 
+#include <climits>
+#include <random>
 #include <string>
 
 #include "tests/data_package_access.h"
@@ -108,6 +110,30 @@ TEST(ScannerTest, GetItemTypeClassifiesTheNextTagWithoutMovingTheCursor) {
     Access::StartReading(text);
     EXPECT_EQ(Access::GetItemType(c.name), c.type) << c.text;
     EXPECT_EQ(Access::Cursor(), 0) << c.text;
+  }
+}
+
+TEST(ScannerTest, WhatFailedTagSearchesLearnChangesNoLaterSearch) {
+  // Texts dense in tags, tags inside tag contents, near-names and ids.
+  const std::string pieces[] = {"<",  ">", " ",       "I",  "Items", " id=\"1\"",
+                                "</", "x", "<Items>", "\n", "<<",    "Type="};
+  std::mt19937 random(11);
+  for (int round = 0; round < 2000; ++round) {
+    std::string text;
+    const int length = static_cast<int>(random() % 40);
+    for (int i = 0; i < length; ++i)
+      text += pieces[random() % std::size(pieces)];
+    int learnt = INT_MAX;
+    for (int start = 0; start <= static_cast<int>(text.size()); ++start) {
+      Access::StartReading(text);
+      Access::Cursor() = start;
+      int unknown = INT_MAX;
+      const bool expected = Access::SearchTag("Items", unknown);
+      const int expectedCursor = Access::Cursor();
+      Access::Cursor() = start;
+      ASSERT_EQ(Access::SearchTag("Items", learnt), expected) << text << " from " << start;
+      ASSERT_EQ(Access::Cursor(), expectedCursor) << text << " from " << start;
+    }
   }
 }
 
