@@ -15,7 +15,8 @@ namespace {
 
 constexpr const char* kLibrarySuffix = ".dll";
 
-std::string LastSystemError() {
+// The system's message for the last error, on one line, with the file put in for its "%1".
+std::string LastSystemError(const std::string& file) {
   const DWORD code = GetLastError();
   char* text = nullptr;
   const DWORD length = FormatMessageA(
@@ -26,12 +27,20 @@ std::string LastSystemError() {
   while (!message.empty() && (message.back() == '\n' || message.back() == '\r')) {
     message.pop_back();
   }
+  for (std::size_t at = message.find("%1"); at != std::string::npos;
+       at = message.find("%1", at + file.size())) {
+    message.replace(at, 2, file);
+  }
   return message;
 }
 
 void* OpenModule(const std::string& path, std::string& error) {
+  // The caller reports a plug-in that fails to load; the system shows no dialog box for it.
+  DWORD previousMode = 0;
+  SetThreadErrorMode(SEM_FAILCRITICALERRORS | SEM_NOOPENFILEERRORBOX, &previousMode);
   HMODULE module = LoadLibraryA(path.c_str());
-  if (!module) error = LastSystemError();
+  if (!module) error = LastSystemError(std::filesystem::path(path).filename().string());
+  SetThreadErrorMode(previousMode, nullptr);
   return module;
 }
 
@@ -68,9 +77,14 @@ std::string ChannelLibraryFileName(const GUID& type) { return GuidToString(type)
 
 std::string ExecutableFolder() {
 #if defined(_WIN32)
-  char path[MAX_PATH];
-  const DWORD length = GetModuleFileNameA(nullptr, path, MAX_PATH);
-  return std::filesystem::path(std::string(path, length)).parent_path().string();
+  // A path that fills the buffer may have been cut short: try again with a larger one.
+  std::string path(MAX_PATH, '\0');
+  DWORD length;
+  while ((length = GetModuleFileNameA(nullptr, path.data(), static_cast<DWORD>(path.size()))) ==
+         path.size())
+    path.resize(path.size() * 2);
+  path.resize(length);
+  return std::filesystem::path(path).parent_path().string();
 #else
   return std::filesystem::read_symlink("/proc/self/exe").parent_path().string();
 #endif

@@ -14,12 +14,17 @@ struct D3DXMATRIX {
   float m[4][4];
 };
 
+// Windows has its own; a second definition would clash wherever <windows.h> is included too.
+#if defined(_WIN32)
+#include <windef.h>
+#else
 struct tagRECT {
   std::int32_t left;
   std::int32_t top;
   std::int32_t right;
   std::int32_t bottom;
 };
+#endif
 
 static_assert(sizeof(D3DXVECTOR3) == 12);
 static_assert(sizeof(D3DXMATRIX) == 64);

@@ -33,7 +33,9 @@ VORN_EXPORT Vorn_Channel* InitDLL() { return new (std::nothrow) Lum_DataPackage;
 }  // extern "C"
 
 #if defined(_WIN32)
-BOOL WINAPI DllMain(HINSTANCE instance, DWORD reason, LPVOID) {
+// The runtime's DLL entry point calls DllMain by its C name, or an empty one of its own. A
+// DataDirectory keeps no per-thread state, so thread notifications are switched off.
+extern "C" BOOL WINAPI DllMain(HINSTANCE instance, DWORD reason, LPVOID) {
   if (reason == DLL_PROCESS_ATTACH) DisableThreadLibraryCalls(instance);
   return TRUE;
 }

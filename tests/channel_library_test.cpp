@@ -1,7 +1,16 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
+#include <fstream>
 #include <string>
+
+#if defined(_WIN32)
+#define WIN32_LEAN_AND_MEAN
+#include <windows.h>
+#else
+#include <cerrno>
+#include <cstring>
+#endif
 
 #include "host/channel_library.h"
 #include "tests/plugins.h"
@@ -22,27 +31,75 @@ TEST(ChannelLibraryTest, LoadsAPlugInByItsGuidFileName) {
   EXPECT_STREQ(library->Type().typeName, "DataDirectory");
 }
 
-TEST(ChannelLibraryTest, MissingFileIsNamedInTheError) {
-  std::string error;
-  EXPECT_EQ(ChannelLibrary::Open(ExecutableFolder(), kNowhereGuid, error), nullptr);
-  EXPECT_NE(error.find(ChannelLibraryFileName(kNowhereGuid)), std::string::npos) << error;
-  EXPECT_NE(error.find("cannot load channel plug-in"), std::string::npos) << error;
+// The system's own words for a library file that is not there.
+std::string MissingFileMessage() {
+#if defined(_WIN32)
+  char* text = nullptr;
+  const DWORD length = FormatMessageA(
+      FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS,
+      nullptr, ERROR_MOD_NOT_FOUND, 0, reinterpret_cast<char*>(&text), 0, nullptr);
+  std::string message(text, length);
+  LocalFree(text);
+  return message.substr(0, message.find_last_not_of("\r\n") + 1);
+#else
+  return std::strerror(ENOENT);
+#endif
+}
+
+// A folder of the test's own, removed with everything in it when the test ends.
+class ScratchFolder {
+ public:
+  ScratchFolder() : path_(fs::temp_directory_path() / "channel_library_test") {
+    fs::create_directories(path_);
+  }
+  ~ScratchFolder() { fs::remove_all(path_); }
+  ScratchFolder(const ScratchFolder&) = delete;
+  ScratchFolder& operator=(const ScratchFolder&) = delete;
+  const fs::path& Path() const { return path_; }
+
+ private:
+  fs::path path_;
+};
+
+TEST(ChannelLibraryTest, LoadFailuresNameTheFileAndGiveTheSystemsReason) {
+  const ScratchFolder scratch;
+  std::ofstream(scratch.Path() / ChannelLibraryFileName(kNowhereGuid)) << "no library";
+
+  struct Case {
+    const char* what;
+    std::string folder;
+    std::string reason;  // empty: whatever the system says
+  };
+  const Case cases[] = {
+      {"missing file", ExecutableFolder(), MissingFileMessage()},
+      {"not a library", scratch.Path().string(), ""},
+  };
+  for (const Case& c : cases) {
+    std::string error;
+    EXPECT_EQ(ChannelLibrary::Open(c.folder, kNowhereGuid, error), nullptr) << c.what;
+    const std::string file = (fs::path(c.folder) / ChannelLibraryFileName(kNowhereGuid)).string();
+    const std::string lead = "cannot load channel plug-in " + file + ": ";
+    ASSERT_EQ(error.substr(0, lead.size()), lead) << c.what;
+    const std::string reason = error.substr(lead.size());
+    EXPECT_FALSE(reason.empty()) << c.what;
+    EXPECT_NE(reason.find(c.reason), std::string::npos) << error;
+    EXPECT_EQ(reason.find_first_of("\r\n"), std::string::npos) << error;  // one line in a log
+    EXPECT_EQ(reason.find("%1"), std::string::npos) << error;  // the file put in, not a marker
+  }
 }
 
 TEST(ChannelLibraryTest, LibraryWithoutTheExportsIsRefused) {
   // The engine library itself is a loadable library without GetType and InitDLL.
-  const fs::path folder = fs::temp_directory_path() / "channel_library_test";
-  fs::create_directories(folder);
-  const fs::path impostor = folder / ChannelLibraryFileName(kNowhereGuid);
+  const ScratchFolder scratch;
+  const fs::path impostor = scratch.Path() / ChannelLibraryFileName(kNowhereGuid);
   const std::string engineFile = std::string("Tessel") + fs::path(impostor).extension().string();
   fs::copy_file(fs::path(ExecutableFolder()) / engineFile, impostor,
                 fs::copy_options::overwrite_existing);
 
   std::string error;
-  EXPECT_EQ(ChannelLibrary::Open(folder.string(), kNowhereGuid, error), nullptr);
+  EXPECT_EQ(ChannelLibrary::Open(scratch.Path().string(), kNowhereGuid, error), nullptr);
   EXPECT_NE(error.find(impostor.filename().string()), std::string::npos) << error;
   EXPECT_NE(error.find("does not export GetType"), std::string::npos) << error;
-  fs::remove_all(folder);
 }
 
 TEST(ChannelLibraryTest, ChannelsKeepTheirLibraryLoaded) {
