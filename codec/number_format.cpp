@@ -10,45 +10,60 @@ namespace {
 
 constexpr int kPrecision = 6;  // what "%g" uses without an explicit precision
 
-char* Copy(const char* text, int count, char* out) {
-  std::memcpy(out, text, static_cast<std::size_t>(count));
-  return out + count;
-}
-
-// `digits` holds `count` significant digits without trailing zeros; `exp10` is the decimal exponent
-// of the first one.
-char* LayOut(const char* digits, int count, int exp10, char* out) {
+// Lays out `count` significant digits (no trailing zeros) whose first has decimal exponent
+// `exp10` the way "%g" does. Works in fixed-size chunks inside `local`, which may hold scratch
+// past the returned length; `digits` must stay readable for eight bytes past each copy start.
+std::size_t LayOut(const char* digits, int count, int exp10, char (&local)[24]) {
   if (exp10 < -4 || exp10 >= kPrecision) {
-    *out++ = digits[0];
+    local[0] = digits[0];
+    int length = 1;
     if (count > 1) {
-      *out++ = '.';
-      out = Copy(digits + 1, count - 1, out);
+      local[1] = '.';
+      std::memcpy(local + 2, digits + 1, 8);
+      length = count + 1;
     }
-    *out++ = 'e';
-    *out++ = exp10 < 0 ? '-' : '+';
     // Normal floats stay within e-38..e+38, so two exponent digits always suffice.
     const int magnitude = exp10 < 0 ? -exp10 : exp10;
-    *out++ = static_cast<char>('0' + magnitude / 10);
-    *out++ = static_cast<char>('0' + magnitude % 10);
-    return out;
+    local[length] = 'e';
+    local[length + 1] = exp10 < 0 ? '-' : '+';
+    local[length + 2] = static_cast<char>('0' + magnitude / 10);
+    local[length + 3] = static_cast<char>('0' + magnitude % 10);
+    return static_cast<std::size_t>(length + 4);
   }
   if (exp10 < 0) {
-    *out++ = '0';
-    *out++ = '.';
-    for (int i = -1; i > exp10; --i)
-      *out++ = '0';
-    return Copy(digits, count, out);
+    std::memcpy(local, "0.000000", 8);
+    std::memcpy(local + 1 - exp10, digits, 8);
+    return static_cast<std::size_t>(1 - exp10 + count);
   }
   const int integer_digits = exp10 + 1;
+  std::memcpy(local, digits, 8);
   if (count <= integer_digits) {
-    out = Copy(digits, count, out);
-    for (int i = count; i < integer_digits; ++i)
-      *out++ = '0';
-    return out;
+    std::memcpy(local + count, "00000000", 8);
+    return static_cast<std::size_t>(integer_digits);
   }
-  out = Copy(digits, integer_digits, out);
-  *out++ = '.';
-  return Copy(digits + integer_digits, count - integer_digits, out);
+  local[integer_digits] = '.';
+  std::memcpy(local + integer_digits + 1, digits + integer_digits, 8);
+  return static_cast<std::size_t>(count + 1);
+}
+
+// Whether the seven digits D (last one 5, first at `exp10`) are the float's exact value, i.e. a
+// float holds D * 10^-j exactly. D is odd, so for j <= 0 that takes D * 5^-j < 2^24, and for j > 0
+// it takes 5^j dividing D (the rest of D is then below 2^24 anyway).
+bool IsExactTie(const char* digits, int exp10) {
+  const int j = kPrecision - exp10;
+  if (j > 10 || j < -2) return false;  // 5^11 exceeds seven digits; D * 5^3 exceeds 2^24
+  std::uint32_t d = 0;
+  for (int i = 0; i <= kPrecision; ++i)
+    d = d * 10 + static_cast<std::uint32_t>(digits[i] - '0');
+  if (j <= 0) {
+    for (int i = 0; i < -j; ++i)
+      d *= 5;
+    return d < (1u << 24);
+  }
+  std::uint32_t power = 1;
+  for (int i = 0; i < j; ++i)
+    power *= 5;
+  return d % power == 0;
 }
 
 }  // namespace
@@ -75,30 +90,33 @@ std::size_t FormatFloat(float value, char* out) {
   // closer candidate. That leaves S sitting exactly on a boundary, where only the exact value
   // decides, and subnormals, whose ulp is too coarse; both take the slow route.
   if (magnitude >= 0x00800000u) {
-    char text[24];  // "d.dddddddde-XX"
+    // "d[.dddddddd]e±XX" after one spare byte, so that moving the first digit onto the point
+    // leaves all digits contiguous. A normal float's exponent always has two digits.
+    char text[24];
     const char* const end =
-        std::to_chars(text, text + sizeof text, abs_value, std::chars_format::scientific).ptr;
-    char digits[12];
-    int count = 0;
-    const char* s = text;
-    digits[count++] = *s++;
-    if (*s == '.') {
-      for (++s; *s != 'e'; ++s)
-        digits[count++] = *s;
+        std::to_chars(text + 1, text + 16, abs_value, std::chars_format::scientific).ptr;
+    int exp10 = (end[-2] - '0') * 10 + (end[-1] - '0');
+    if (end[-3] == '-') exp10 = -exp10;
+    char* digits = text + 1;
+    int count = 1;
+    if (end - text > 6) {
+      text[2] = text[1];
+      digits = text + 2;
+      count = static_cast<int>(end - text) - 6;
     }
-    ++s;  // 'e'
-    const bool negative_exponent = *s++ == '-';
-    int exp10 = 0;
-    for (; s != end; ++s)
-      exp10 = exp10 * 10 + (*s - '0');
-    if (negative_exponent) exp10 = -exp10;
 
     bool exact_tie = false;
     if (count > kPrecision) {
       const char next = digits[kPrecision];
-      exact_tie = next == '5' && count == kPrecision + 1;
+      bool up = next > '5' || (next == '5' && count > kPrecision + 1);
+      if (next == '5' && count == kPrecision + 1) {
+        // S sits on a rounding boundary; round half to even if it is the exact value, as printf
+        // does, and otherwise let the exact value decide.
+        exact_tie = !IsExactTie(digits, exp10);
+        up = (digits[kPrecision - 1] - '0') % 2 != 0;
+      }
       count = kPrecision;
-      if (next >= '5') {
+      if (up) {
         int i = kPrecision - 1;
         while (i >= 0 && digits[i] == '9')
           --i;  // the nines become dropped trailing zeros
@@ -115,7 +133,12 @@ std::size_t FormatFloat(float value, char* out) {
           --count;
       }
     }
-    if (!exact_tie) return static_cast<std::size_t>(LayOut(digits, count, exp10, p) - out);
+    if (!exact_tie) {
+      char local[24];
+      const std::size_t length = LayOut(digits, count, exp10, local);
+      std::memcpy(p, local, length);
+      return static_cast<std::size_t>(p - out) + length;
+    }
   }
   const char* const end = std::to_chars(p, out + kMaxFloatText, static_cast<double>(abs_value),
                                         std::chars_format::general, kPrecision)

@@ -1,5 +1,4 @@
-#ifndef NUMBERS_CODEC_NUMBER_FORMAT_H_
-#define NUMBERS_CODEC_NUMBER_FORMAT_H_
+#pragma once
 
 #include <cstddef>
 
@@ -17,5 +16,3 @@ std::size_t FormatFloat(float value, char* out);
 std::size_t FormatInt(int value, char* out);
 
 }  // namespace numbers
-
-#endif  // NUMBERS_CODEC_NUMBER_FORMAT_H_

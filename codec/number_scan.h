@@ -1,5 +1,4 @@
-#ifndef NUMBERS_CODEC_NUMBER_SCAN_H_
-#define NUMBERS_CODEC_NUMBER_SCAN_H_
+#pragma once
 
 #include <string_view>
 
@@ -19,5 +18,3 @@ const char* ScanFloat(const char* first, const char* last, float& value);
 int ScanFloats(const char* first, const char* last, std::string_view format, float* values);
 
 }  // namespace numbers
-
-#endif  // NUMBERS_CODEC_NUMBER_SCAN_H_
