@@ -12,5 +12,7 @@ function(vorn_library target output_name build_macro)
     DEFINE_SYMBOL "${build_macro}"
     CXX_VISIBILITY_PRESET hidden
     VISIBILITY_INLINES_HIDDEN ON)
+  # Exported members still call each other directly and inline: nothing replaces them at load.
+  target_compile_options(${target} PRIVATE -fno-semantic-interposition)
   project_warnings(${target})
 endfunction()

@@ -13,3 +13,7 @@ set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
 set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
 set(CMAKE_FIND_ROOT_PATH_MODE_PACKAGE ONLY)
+
+# Float arithmetic in SSE registers, rounded once per operation as on every other target; the
+# x87 unit would round twice, and number texts must read the same everywhere.
+set(CMAKE_CXX_FLAGS_INIT "-msse2 -mfpmath=sse")

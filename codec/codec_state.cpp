@@ -23,8 +23,7 @@ char Lum_DataPackage::newlineBuffer[3] = {};
 char Lum_DataPackage::stringBeforeBuffer[kTextLength] = {};
 const Lum_DataPackage* Lum_DataPackage::walkPath[kMaxNesting] = {};
 int Lum_DataPackage::walkDepth = 0;
-Lum_DataPackage::DelimiterMemo Lum_DataPackage::delimiterMemo[4] = {
-    {"<", 0, -1}, {">", 0, -1}, {"</", 0, -1}, {"Type=", 0, -1}};
+Lum_DataPackage::DelimiterMemo Lum_DataPackage::delimiterMemo[4] = {};
 Lum_DataPackage::TagSearchMemo Lum_DataPackage::tagSearchMemo[kTagSearchMemos] = {};
 unsigned int Lum_DataPackage::readSerial = 0;
 

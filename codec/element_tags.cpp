@@ -86,8 +86,28 @@ void Lum_DataPackage::WriteTypedElement(const char* name, std::string_view type,
 
 // Reading: takes the element at the next "<" when its name is `name`, leaving the cursor just
 // after its opening tag; otherwise puts the cursor back and reports false.
+// A name that trimmed text can equal, and in which no "Type=" cuts the text short.
+bool Lum_DataPackage::IsPlainName(std::string_view name) {
+  return !name.empty() && name.size() < kTextLength && !IsWhiteSpace(name.front()) &&
+         !IsWhiteSpace(name.back()) && name.find("Type=") == std::string_view::npos;
+}
+
 bool Lum_DataPackage::ReadTypedElementName(const char* name) {
   const int start = bufferCursor;
+  const std::size_t length = std::strlen(name);
+  const char* const open = Find("<");
+  if (open && IsPlainName(std::string_view(name, length))) {
+    // The trimmed text between "<" and the first "Type=" equals such a name exactly when the name
+    // stands right after the "<" and whitespace, followed by whitespace and "Type=": "Type=" can
+    // neither start inside the name nor straddle its end. So it is compared where it stands.
+    const char* p = SkipWhiteSpace(open + 1);
+    const bool match = static_cast<std::size_t>(textEnd - p) >= length &&
+                       std::memcmp(p, name, length) == 0 &&
+                       std::string_view(SkipWhiteSpace(p + length), textEnd).starts_with("Type=");
+    bufferCursor = match ? static_cast<int>(p + length - bufferStart) : start;
+    if (match) MoveCursorAfter(">");
+    return match;
+  }
   MoveCursorAfter("<");
   CutStringBefore("Type=", tmp2);
   MoveCursorAfter(">");

@@ -66,6 +66,56 @@ bool IsExactTie(const char* digits, int exp10) {
   return d % power == 0;
 }
 
+constexpr char kDigitPairs[] =
+    "00010203040506070809101112131415161718192021222324252627282930313233343536373839"
+    "40414243444546474849505152535455565758596061626364656667686970717273747576777879"
+    "8081828384858687888990919293949596979899";
+
+// Powers of ten that a double holds exactly.
+constexpr double kExactPowers[] = {1e0,  1e1,  1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
+                                   1e8,  1e9,  1e10, 1e11, 1e12, 1e13, 1e14, 1e15,
+                                   1e16, 1e17, 1e18, 1e19, 1e20, 1e21, 1e22};
+constexpr int kLargestExactPower = 22;
+
+// value * 10^power in double precision, with at most two roundings.
+double Scale(double value, int power) {
+  if (power >= 0) {
+    if (power > kLargestExactPower) {
+      value *= kExactPowers[kLargestExactPower];
+      power -= kLargestExactPower;
+    }
+    return value * kExactPowers[power];
+  }
+  if (-power > kLargestExactPower) {
+    value /= kExactPowers[kLargestExactPower];
+    power += kLargestExactPower;
+  }
+  return value / kExactPowers[-power];
+}
+
+// The six significant digits of a normal float, rounded as "%g" rounds them, found by scaling it
+// into [10^5, 10^6). The scaling errs by a few units in the 16th digit, far below the half unit in
+// the 7th that decides the rounding; only a value within that error of a tie is left to the
+// caller, which then reports false.
+bool SixDigits(float value, std::uint32_t& digits, int& exp10) {
+  const int exp2 = static_cast<int>(std::bit_cast<std::uint32_t>(value) >> 23) - 127;
+  exp10 = (exp2 * 78913) >> 18;  // floor(exp2 * log10(2)): the true exponent or one below it
+  double scaled = Scale(value, kPrecision - 1 - exp10);
+  if (scaled >= 1e6) {
+    ++exp10;
+    scaled = Scale(value, kPrecision - 1 - exp10);
+  }
+  const double whole = static_cast<double>(static_cast<std::uint32_t>(scaled));
+  const double fraction = scaled - whole;
+  if (fraction > 0.5 - 1e-7 && fraction < 0.5 + 1e-7) return false;
+  digits = static_cast<std::uint32_t>(whole) + (fraction > 0.5 ? 1 : 0);
+  if (digits == 1000000) {
+    digits = 100000;
+    ++exp10;
+  }
+  return digits >= 100000 && digits < 1000000;
+}
+
 }  // namespace
 
 std::size_t FormatFloat(float value, char* out) {
@@ -82,6 +132,24 @@ std::size_t FormatFloat(float value, char* out) {
     return static_cast<std::size_t>(p - out);
   }
   const auto abs_value = std::bit_cast<float>(magnitude);
+
+  std::uint32_t six;
+  int six_exp10;
+  if (magnitude >= 0x00800000u && SixDigits(abs_value, six, six_exp10)) {
+    // LayOut copies in chunks of eight from any digit on; the places after the sixth never show.
+    char digits[16] = {'0', '0', '0', '0', '0', '0', '0', '0',
+                       '0', '0', '0', '0', '0', '0', '0', '0'};
+    int count = kPrecision;
+    std::memcpy(digits, kDigitPairs + 2 * (six / 10000), 2);
+    std::memcpy(digits + 2, kDigitPairs + 2 * (six / 100 % 100), 2);
+    std::memcpy(digits + 4, kDigitPairs + 2 * (six % 100), 2);
+    while (digits[count - 1] == '0')
+      --count;
+    char local[24];
+    const std::size_t length = LayOut(digits, count, six_exp10, local);
+    std::memcpy(p, local, length);
+    return static_cast<std::size_t>(p - out) + length;
+  }
 
   // The shortest round-trip form S lies within half an ulp of the value, and no candidate with as
   // few digits is closer. A normal float's half ulp is below half a unit in the sixth digit, so an

@@ -268,6 +268,54 @@ const char* ScanSlow(const char* p, const char* last, float& value) {
   return p;
 }
 
+// Powers of ten that a float holds exactly.
+constexpr float kExactPowers[] = {1e0f, 1e1f, 1e2f, 1e3f, 1e4f, 1e5f,
+                                  1e6f, 1e7f, 1e8f, 1e9f, 1e10f};
+constexpr int kLargestExactPower = 10;
+constexpr std::uint32_t kExactSignificand = 1u << 24;
+
+// Short decimals, as packages hold them, p at the first digit or point. When all digits make an
+// integer that a float holds exactly and the power of ten is one too, one correctly rounded
+// multiplication or division gives what strtof gives. Returns null for anything else, including
+// a dangling exponent or a hexadecimal prefix, whose reading scanf decides its own way.
+const char* ScanShortDecimal(const char* p, const char* last, bool negative, float& value) {
+  std::uint32_t significand = 0;
+  int power = 0;
+  bool digits = false;
+  char c = At(p, last);
+  for (; IsDigit(c); c = At(++p, last)) {
+    significand = significand * 10 + static_cast<std::uint32_t>(c - '0');
+    if (significand > kExactSignificand) return nullptr;
+    digits = true;
+  }
+  if (c == '.') {
+    for (c = At(++p, last); IsDigit(c); c = At(++p, last)) {
+      significand = significand * 10 + static_cast<std::uint32_t>(c - '0');
+      if (significand > kExactSignificand) return nullptr;
+      --power;
+      digits = true;
+    }
+  }
+  if (!digits || Lower(c) == 'x') return nullptr;
+  if (Lower(c) == 'e') {
+    c = At(++p, last);
+    const bool negativeExponent = c == '-';
+    if (c == '-' || c == '+') c = At(++p, last);
+    if (!IsDigit(c)) return nullptr;
+    int exponent = 0;
+    for (; IsDigit(c) && exponent <= kLargestExactPower * 4; c = At(++p, last)) {
+      exponent = exponent * 10 + (c - '0');
+    }
+    if (IsDigit(c)) return nullptr;
+    power += negativeExponent ? -exponent : exponent;
+  }
+  if (power < -kLargestExactPower || power > kLargestExactPower) return nullptr;
+  float magnitude = static_cast<float>(significand);
+  magnitude = power < 0 ? magnitude / kExactPowers[-power] : magnitude * kExactPowers[power];
+  value = negative ? -magnitude : magnitude;
+  return p;
+}
+
 }  // namespace
 
 const char* ScanFloat(const char* first, const char* last, float& value) {
@@ -279,6 +327,7 @@ const char* ScanFloat(const char* first, const char* last, float& value) {
   char c = At(digits, last);
   if (c == '-' || c == '+') c = At(++digits, last);
   if (IsDigit(c) || c == '.') {
+    if (const char* end = ScanShortDecimal(digits, last, *p == '-', value)) return end;
     float parsed;
     const auto [end, error] = std::from_chars(digits, last, parsed);
     if (error == std::errc()) {

@@ -16,22 +16,43 @@ bool StartsWith(std::string_view text, const char* prefix) {
 
 }  // namespace
 
+// The memo of the delimiters the readers use; others go unremembered.
+Lum_DataPackage::DelimiterMemo* Lum_DataPackage::MemoFor(std::string_view pattern) {
+  switch (pattern.size()) {
+    case 1:
+      return pattern[0] == '<'   ? &delimiterMemo[0]
+             : pattern[0] == '>' ? &delimiterMemo[1]
+                                 : nullptr;
+    case 2:
+      return pattern == "</" ? &delimiterMemo[2] : nullptr;
+    case 5:
+      return pattern == "Type=" ? &delimiterMemo[3] : nullptr;
+    default:
+      return nullptr;
+  }
+}
+
 // The first occurrence at or after the cursor that lies wholly inside the text. Readers search
 // for the same few delimiters from cursors that mostly move forward; remembering the last answer
 // for each keeps a missing or far delimiter from being searched for over and over.
 const char* Lum_DataPackage::Find(std::string_view pattern) {
-  DelimiterMemo* memo = nullptr;
-  for (DelimiterMemo& candidate : delimiterMemo) {
-    if (candidate.delimiter == pattern) memo = &candidate;
-  }
+  DelimiterMemo* memo = MemoFor(pattern);
   if (memo && memo->from <= bufferCursor && (memo->found < 0 || bufferCursor <= memo->found)) {
     return memo->found < 0 ? nullptr : bufferStart + memo->found;
   }
+  const char* found = nullptr;
   const char* from = bufferStart + bufferCursor;
-  const std::string_view rest(from, static_cast<std::size_t>(textEnd - from));
-  const std::size_t at = rest.find(pattern);
-  const char* found = at == std::string_view::npos ? nullptr : from + at;
-  if (memo) *memo = {pattern, bufferCursor, found ? static_cast<int>(found - bufferStart) : -1};
+  if (static_cast<std::size_t>(textEnd - from) >= pattern.size()) {
+    const char* const lastStart = textEnd - pattern.size() + 1;
+    while (from < lastStart) {
+      from = static_cast<const char*>(
+          std::memchr(from, pattern[0], static_cast<std::size_t>(lastStart - from)));
+      if (!from || std::equal(pattern.begin() + 1, pattern.end(), from + 1)) break;
+      ++from;
+    }
+    found = from < lastStart ? from : nullptr;
+  }
+  if (memo) *memo = {bufferCursor, found ? static_cast<int>(found - bufferStart) : -1};
   return found;
 }
 
@@ -42,10 +63,9 @@ void Lum_DataPackage::ForgetSearches() {
   ++readSerial;
 }
 
-void Lum_DataPackage::MoveCursorAfter(const char* pattern) {
-  const std::size_t length = std::strlen(pattern);
-  if (const char* found = Find(std::string_view(pattern, length))) {
-    bufferCursor = static_cast<int>(found - bufferStart + length);
+void Lum_DataPackage::MoveCursorAfter(std::string_view pattern) {
+  if (const char* found = Find(pattern)) {
+    bufferCursor = static_cast<int>(found - bufferStart + pattern.size());
   }
 }
 
@@ -60,9 +80,7 @@ void Lum_DataPackage::CutStringBefore(std::string_view delimiter, char* text) {
   text[0] = '\0';
   const char* end = Find(delimiter);
   if (!end) return;
-  const char* begin = bufferStart + bufferCursor;
-  while (begin < textEnd && IsWhiteSpace(*begin))
-    ++begin;
+  const char* const begin = SkipWhiteSpace(bufferStart + bufferCursor);
   bufferCursor = static_cast<int>(begin - bufferStart);
   while (end > begin && IsWhiteSpace(end[-1]))
     --end;
@@ -71,6 +89,12 @@ void Lum_DataPackage::CutStringBefore(std::string_view delimiter, char* text) {
   std::memcpy(text, begin, length);
   text[length] = '\0';
   bufferCursor = static_cast<int>(end - bufferStart);
+}
+
+const char* Lum_DataPackage::SkipWhiteSpace(const char* p) {
+  while (p < textEnd && IsWhiteSpace(*p))
+    ++p;
+  return p;
 }
 
 bool Lum_DataPackage::IsWhiteSpace(char c) {
@@ -123,9 +147,7 @@ bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
 int Lum_DataPackage::GetItemType(const char* name) {
   const int start = bufferCursor;
   const auto skipWhiteSpace = [] {
-    while (bufferStart + bufferCursor < textEnd && IsWhiteSpace(bufferStart[bufferCursor])) {
-      ++bufferCursor;
-    }
+    bufferCursor = static_cast<int>(SkipWhiteSpace(bufferStart + bufferCursor) - bufferStart);
   };
   const auto rest = [] {
     const char* here = bufferStart + bufferCursor;

@@ -59,12 +59,15 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   static const char* GetNewline();
 
   // Scanning.
+  struct DelimiterMemo;
+  static DelimiterMemo* MemoFor(std::string_view pattern);
   static const char* Find(std::string_view pattern);
   static void ForgetSearches();
-  static void MoveCursorAfter(const char* pattern);
+  static void MoveCursorAfter(std::string_view pattern);
   static char* GetStringBefore(const char* delimiter);
   static void CutStringBefore(std::string_view delimiter, char* text);
   static bool IsWhiteSpace(char c);
+  static const char* SkipWhiteSpace(const char* p);
   static bool MoveCursorBeforeTag(const char* name);
   static bool SearchTag(const char* name, int& failsFrom);
   static int GetItemType(const char* name);
@@ -79,6 +82,7 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   static void XML_MatrixTag(const char* name, D3DXMATRIX& matrix);
   static void WriteTypedElement(const char* name, std::string_view type, std::string_view value);
   static bool ReadTypedElementName(const char* name);
+  static bool IsPlainName(std::string_view name);
 
   // Directory walk.
   void TakeTagName();
@@ -117,7 +121,6 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   // What one read has learnt about its text, so that no search runs over the same stretch again
   // and again: where each delimiter next occurs, and where each directory's tag search fails.
   struct DelimiterMemo {
-    std::string_view delimiter;
     int from;   // the memo answers searches starting from here...
     int found;  // ...up to here, with this occurrence; -1: none from `from` on
   };
@@ -127,7 +130,7 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
     int failsFrom;
   };
   static constexpr int kTagSearchMemos = 256;  // indexed by the top 8 bits of a hash
-  static DelimiterMemo delimiterMemo[4];
+  static DelimiterMemo delimiterMemo[4];       // "<", ">", "</", "Type="
   static TagSearchMemo tagSearchMemo[kTagSearchMemos];
   static unsigned int readSerial;
 };
