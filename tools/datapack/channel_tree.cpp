@@ -1,0 +1,191 @@
+#include "tools/datapack/channel_tree.h"
+
+#include <climits>
+#include <stdexcept>
+
+#include "host/callback_channel.h"
+#include "host/matrix_channel.h"
+#include "host/value_channel.h"
+#include "host/vector_channel.h"
+#include "plugin/data_package.h"
+#include "tools/datapack/input_error.h"
+
+namespace datapack {
+namespace {
+
+using Link = Lum_DataPackage::Link;
+
+ChannelHandle Owned(Vorn_Channel* channel) { return ChannelHandle(channel, ChannelDeleter{}); }
+
+ChannelHandle Created(const ChannelLibrary& library) {
+  ChannelHandle channel = library.CreateChannel();
+  if (!channel) throw std::bad_alloc();
+  return channel;
+}
+
+void Attach(Vorn_Channel& parent, int link, Vorn_Channel& child) {
+  if (!parent.AttachChild(link, &child)) {
+    throw std::logic_error("the host refused a channel on link " + std::to_string(link));
+  }
+}
+
+Lum_StringChannel& AsText(Vorn_Channel& channel) {
+  return static_cast<Lum_StringChannel&>(channel);
+}
+
+}  // namespace
+
+// One DataDirectory with the channels on its links. Writing, `supply` holds the entries to hand
+// out; reading, each entry read is added to `collected`.
+struct ChannelTree::Node {
+  ChannelHandle directory;
+  ChannelHandle tag;
+  Lum_ValueChannel count;
+  Lum_ValueChannel index;
+  Lum_CallbackChannel callEachIteration;
+  std::vector<Kind> kinds;
+  std::vector<ChannelHandle> data;
+  std::vector<std::unique_ptr<Node>> directories;
+  const std::vector<Entry>* supply = nullptr;
+  std::vector<Entry> collected;
+
+  Node(const Plugins& plugins, const Shape& shape)
+      : directory(Created(*plugins.directories)), tag(Created(*plugins.texts)) {
+    AsText(*tag).SetString(shape.name.c_str());
+    Attach(Directory(), Link::kTagLink, *tag);
+    Attach(Directory(), Link::kCountLink, count);
+    Attach(Directory(), Link::kCurrentIndexLink, index);
+    for (const DataSlot& slot : shape.data) {
+      kinds.push_back(slot.kind);
+      data.push_back(NewData(plugins, slot.kind));
+      data.back()->SetChannelName(slot.name.c_str());
+      Attach(Directory(), Link::kDataLink, *data.back());
+    }
+    for (const Shape& sub : shape.directories) {
+      directories.push_back(std::make_unique<Node>(plugins, sub));
+      Attach(Directory(), Link::kSubDirectoriesLink, directories.back()->Directory());
+    }
+    Attach(Directory(), Link::kCallEachIterationLink, callEachIteration);
+  }
+
+  Lum_DataPackage& Directory() { return *static_cast<Lum_DataPackage*>(directory.get()); }
+
+  static ChannelHandle NewData(const Plugins& plugins, Kind kind) {
+    switch (kind) {
+      case Kind::kText:
+        return Created(*plugins.texts);
+      case Kind::kValue:
+        return Owned(new Lum_ValueChannel);
+      case Kind::kVector:
+        return Owned(new Lum_VectorChannel);
+      case Kind::kMatrix:
+        break;
+    }
+    return Owned(new Lum_MatrixChannel);
+  }
+
+  // Before the writer packs an entry: its values, and the entries of each sub-directory in it.
+  void SupplyEntry() {
+    const Entry& entry = (*supply)[static_cast<std::size_t>(index.GetValue())];
+    for (std::size_t i = 0; i < data.size(); ++i)
+      SetValue(i, entry.values[i]);
+    for (std::size_t i = 0; i < directories.size(); ++i)
+      directories[i]->Supply(entry.directories[i]);
+  }
+
+  void Supply(const std::vector<Entry>& entries) {
+    supply = &entries;
+    count.SetValue(static_cast<float>(entries.size()));
+    callEachIteration.SetCallback([this] { SupplyEntry(); });
+  }
+
+  // After the reader has filled an entry: its values, and what each sub-directory took meanwhile.
+  void CollectEntry() {
+    Entry entry;
+    for (std::size_t i = 0; i < data.size(); ++i)
+      entry.values.push_back(GetValue(i));
+    for (const auto& sub : directories) {
+      entry.directories.push_back(std::move(sub->collected));
+      sub->collected.clear();
+    }
+    collected.push_back(std::move(entry));
+  }
+
+  void Collect() {
+    collected.clear();
+    callEachIteration.SetCallback([this] { CollectEntry(); });
+    for (const auto& sub : directories)
+      sub->Collect();
+  }
+
+  void SetValue(std::size_t i, const Value& value) {
+    Vorn_Channel& channel = *data[i];
+    switch (kinds[i]) {
+      case Kind::kText:
+        AsText(channel).SetString(std::get<std::string>(value).c_str());
+        break;
+      case Kind::kValue:
+        static_cast<Lum_ValueChannel&>(channel).SetValue(std::get<float>(value));
+        break;
+      case Kind::kVector:
+        static_cast<Lum_VectorChannel&>(channel).SetVector(std::get<D3DXVECTOR3>(value));
+        break;
+      case Kind::kMatrix:
+        static_cast<Lum_MatrixChannel&>(channel).SetMatrix(std::get<D3DXMATRIX>(value));
+        break;
+    }
+  }
+
+  Value GetValue(std::size_t i) {
+    Vorn_Channel& channel = *data[i];
+    switch (kinds[i]) {
+      case Kind::kText: {
+        const char* text = AsText(channel).GetString();
+        return std::string(text ? text : "");
+      }
+      case Kind::kValue:
+        return static_cast<Lum_ValueChannel&>(channel).GetValue();
+      case Kind::kVector:
+        return static_cast<Lum_VectorChannel&>(channel).GetVector();
+      case Kind::kMatrix:
+        break;
+    }
+    return static_cast<Lum_MatrixChannel&>(channel).GetMatrix();
+  }
+};
+
+ChannelTree::ChannelTree(const Plugins& plugins, const Shape& top)
+    : top_(std::make_unique<Node>(plugins, top)) {}
+
+ChannelTree::~ChannelTree() = default;
+
+std::string ChannelTree::Write(const std::string& header, const std::vector<Entry>& entries,
+                               bool crlf, bool scramble) {
+  Lum_DataPackage& directory = top_->Directory();
+  directory.SetString(header.c_str());
+  top_->Supply(entries);
+  const int size = directory.WriteToBuffer(nullptr, 0, !crlf, false);
+  if (size <= 0 || size == INT_MAX) throw InputError("the package is too large to be written");
+  std::string buffer(static_cast<std::size_t>(size), '\0');
+  if (directory.WriteToBuffer(buffer.data(), size, !crlf, scramble) != size) {
+    throw std::logic_error("the package changed size between measuring and writing");
+  }
+  buffer.pop_back();  // the NUL, scrambled or not
+  return buffer;
+}
+
+std::vector<Entry> ChannelTree::Read(std::string_view text, bool crlf) {
+  if (text.size() >= INT_MAX) throw InputError("the package is too large to be read");
+  std::string buffer(text);
+  top_->Collect();
+  top_->Directory().ReadFromBuffer(buffer.data(), static_cast<int>(buffer.size() + 1), !crlf,
+                                   false);
+  return std::move(top_->collected);
+}
+
+std::string WritePackage(const Plugins& plugins, const Package& package, bool scramble) {
+  return ChannelTree(plugins, package.top)
+      .Write(package.header, package.entries, package.crlf, scramble);
+}
+
+}  // namespace datapack

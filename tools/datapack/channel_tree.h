@@ -1,0 +1,40 @@
+// The channel tree of a package, built through the host as the engine builds it: DataDirectories
+// from the plug-in, texts from the string-channel plug-in, the host's value, vector and matrix
+// channels. Its "Call each iteration" channels hand each entry's values to the writer, or take
+// them from the reader.
+#pragma once
+
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "tools/datapack/package_model.h"
+#include "tools/datapack/plugins.h"
+
+namespace datapack {
+
+class ChannelTree {
+ public:
+  ChannelTree(const Plugins& plugins, const Shape& top);
+  ~ChannelTree();
+  ChannelTree(const ChannelTree&) = delete;
+  ChannelTree& operator=(const ChannelTree&) = delete;
+
+  // The package of these entries, measured first and then written into a buffer of exactly the
+  // measured size; returned without its NUL.
+  std::string Write(const std::string& header, const std::vector<Entry>& entries, bool crlf,
+                    bool scramble);
+
+  // The entries the tree receives from reading the text.
+  std::vector<Entry> Read(std::string_view text, bool crlf);
+
+ private:
+  struct Node;
+  std::unique_ptr<Node> top_;
+};
+
+// Writes the package through a tree of its own shape.
+std::string WritePackage(const Plugins& plugins, const Package& package, bool scramble);
+
+}  // namespace datapack
