@@ -1,0 +1,245 @@
+#include "tools/datapack/structure_finder.h"
+
+#include <optional>
+
+namespace datapack {
+namespace {
+
+constexpr std::string_view kTypeAttribute = "Type=\"";
+constexpr std::string_view kIdAttribute = "id=\"";
+
+// The reader's whitespace.
+bool IsSpace(char c) { return c == ' ' || c == '\t' || c == '\r' || c == '\n'; }
+
+std::string_view Trim(std::string_view text) {
+  while (!text.empty() && IsSpace(text.front()))
+    text.remove_prefix(1);
+  while (!text.empty() && IsSpace(text.back()))
+    text.remove_suffix(1);
+  return text;
+}
+
+std::string Quoted(std::string_view text) {
+  constexpr std::size_t kShown = 40;
+  return "\"" + std::string(text.substr(0, kShown)) + (text.size() > kShown ? "...\"" : "\"");
+}
+
+struct Tag {
+  std::size_t offset = 0;  // of its "<"
+  std::size_t end = 0;     // just after its ">"
+  bool closing = false;
+  std::string_view name;
+  std::optional<Kind> kind;  // set on the opening tag of a data element
+  bool hasId = false;
+};
+
+// One directory of the tree as far as the text has shown it.
+struct Layout {
+  bool named = false;
+  bool filled = false;  // an entry has shown what every entry holds
+  std::string name;
+  std::vector<DataSlot> data;
+  std::vector<Layout> directories;
+
+  Shape ToShape() const {
+    Shape shape{name, data, {}};
+    for (const Layout& sub : directories)
+      shape.directories.push_back(sub.ToShape());
+    return shape;
+  }
+};
+
+class Parser {
+  static constexpr std::size_t npos = std::string_view::npos;
+
+ public:
+  Parser(std::string_view text, std::size_t at) : text_(text), at_(at) {}
+
+  std::size_t At() const { return at_; }
+  bool AtEnd() {
+    SkipSpace();
+    return at_ == text_.size();
+  }
+
+  // The next tag, if a tag comes next; the parser stays where it is.
+  std::optional<Tag> Peek() {
+    SkipSpace();
+    if (at_ == text_.size() || text_[at_] != '<') return std::nullopt;
+    return ReadTag(at_);
+  }
+
+  FoundDirectory Directory(Layout& layout) {
+    const Tag open = Take();
+    if (open.closing || open.kind) Fail(open, "expected a directory element");
+    if (!layout.named) {
+      layout.name = std::string(open.name);
+      layout.named = true;
+    } else if (open.name != layout.name) {
+      Fail(open, "expected the directory " + Quoted(layout.name) + " as in the entries before");
+    }
+    FoundDirectory found{open.offset, {}};
+    if (!open.hasId) {
+      const std::optional<Tag> next = Peek();
+      if (next && next->closing && next->name == open.name) {
+        Take();  // an empty element: it tells nothing of what an entry holds
+        return found;
+      }
+      found.entries.push_back(Contents(layout));
+      Close(open.name);
+      return found;
+    }
+    for (;;) {
+      found.entries.push_back(Contents(layout));
+      Close(open.name);
+      const std::optional<Tag> next = Peek();
+      if (!next || next->closing || next->kind || !next->hasId || next->name != open.name) break;
+      Take();
+    }
+    return found;
+  }
+
+ private:
+  [[noreturn]] static void Fail(std::size_t offset, const std::string& message) {
+    throw StructureError(offset, message);
+  }
+  [[noreturn]] void Fail(const Tag& tag, const std::string& message) const {
+    Fail(tag.offset, message + ", found " + Quoted(text_.substr(tag.offset, tag.end - tag.offset)));
+  }
+
+  void SkipSpace() {
+    while (at_ < text_.size() && IsSpace(text_[at_]))
+      ++at_;
+  }
+
+  Tag ReadTag(std::size_t offset) const {
+    Tag tag;
+    tag.offset = offset;
+    tag.closing = text_.substr(offset, 2) == "</";
+    const std::size_t start = offset + (tag.closing ? 2 : 1);
+    const std::size_t close = text_.find('>', start);
+    if (close == npos) Fail(offset, "a tag without its \">\"");
+    tag.end = close + 1;
+    tag.name = Trim(text_.substr(start, close - start));
+    // A data element named "/..." opens with "</" too; a closing tag never has a type.
+    if (tag.closing && tag.name.ends_with('"') && tag.name.find(kTypeAttribute) != npos) {
+      tag.closing = false;
+      tag.name = Trim(text_.substr(offset + 1, close - offset - 1));
+    }
+    if (tag.closing) return tag;
+    if (const std::size_t type = tag.name.rfind(kTypeAttribute); type != npos) {
+      std::string_view kind = tag.name.substr(type + kTypeAttribute.size());
+      if (kind.empty() || kind.back() != '"' || !KindNamed(kind.substr(0, kind.size() - 1))) {
+        Fail(offset, "unknown element type " + Quoted(kind));
+      }
+      tag.kind = KindNamed(kind.substr(0, kind.size() - 1));
+      tag.name = Trim(tag.name.substr(0, type));
+    } else if (const std::size_t id = tag.name.find(kIdAttribute); id != npos) {
+      const std::string_view number = tag.name.substr(id + kIdAttribute.size());
+      if (number.size() < 2 || number.back() != '"' ||
+          number.substr(0, number.size() - 1).find_first_not_of("0123456789") != npos) {
+        Fail(offset, "an entry id that is not a number: " + Quoted(tag.name));
+      }
+      tag.hasId = true;
+      tag.name = Trim(tag.name.substr(0, id));
+    }
+    return tag;
+  }
+
+  Tag Take() {
+    const std::optional<Tag> tag = Peek();
+    if (!tag) {
+      Fail(at_, at_ == text_.size() ? "the text ends before the directory does"
+                                    : "expected a tag, found " + Quoted(text_.substr(at_)));
+    }
+    at_ = tag->end;
+    return *tag;
+  }
+
+  void Close(std::string_view name) {
+    const Tag tag = Take();
+    if (!tag.closing || tag.name != name) Fail(tag, "expected </" + std::string(name) + ">");
+  }
+
+  // A data element's value runs to the first "</", as the reader takes it.
+  void SkipValue(const Tag& open) {
+    const std::size_t close = text_.find("</", at_);
+    if (close == npos) Fail(open, "a data element without its closing tag");
+    at_ = close;
+    Close(open.name);
+  }
+
+  // One entry: its data elements, then its sub-directories. Returns the sub-directories found.
+  std::vector<FoundDirectory> Contents(Layout& layout) {
+    const std::size_t start = at_;
+    std::vector<DataSlot> data;
+    for (std::optional<Tag> next = Peek(); next && next->kind; next = Peek()) {
+      Take();
+      data.push_back({std::string(next->name), *next->kind});
+      SkipValue(*next);
+    }
+    if (!layout.filled) {
+      layout.data = data;
+    } else if (data != layout.data) {
+      Fail(start, "an entry of " + Quoted(layout.name) +
+                      " holds other data elements than the entries before it");
+    }
+    std::vector<FoundDirectory> subs;
+    for (std::optional<Tag> next = Peek(); next && !next->closing; next = Peek()) {
+      if (!layout.filled) {
+        layout.directories.emplace_back();
+      } else if (subs.size() == layout.directories.size()) {
+        Fail(*next, "an entry of " + Quoted(layout.name) +
+                        " holds more sub-directories than the entries before it");
+      }
+      subs.push_back(Directory(layout.directories[subs.size()]));
+    }
+    if (layout.filled && subs.size() != layout.directories.size()) {
+      Fail(at_, "an entry of " + Quoted(layout.name) +
+                    " holds fewer sub-directories than the entries before it");
+    }
+    layout.filled = true;
+    return subs;
+  }
+
+  std::string_view text_;
+  std::size_t at_;
+};
+
+}  // namespace
+
+Structure FindStructure(std::string_view text) {
+  // The text ends with the closing tag of its directory; the header may hold anything.
+  std::size_t end = text.size();
+  while (end > 0 && IsSpace(text[end - 1]))
+    --end;
+  if (end == 0) throw StructureError(0, "no package: the text is empty");
+  const std::size_t close = text.rfind("</", end - 1);
+  if (text[end - 1] != '>' || close == std::string_view::npos) {
+    throw StructureError(end - 1, "no package: the text does not end with a closing tag");
+  }
+  const std::string_view name = Trim(text.substr(close + 2, end - 1 - (close + 2)));
+  const bool crlf = close >= 2 && text.substr(close - 2, 2) == "\r\n";
+
+  // The directory starts at the first opening tag of that name from which the whole rest reads.
+  std::optional<StructureError> furthest;
+  for (std::size_t at = text.find('<'); at < close; at = text.find('<', at + 1)) {
+    Parser parser(text, at);
+    try {
+      const std::optional<Tag> tag = parser.Peek();
+      if (!tag || tag->closing || tag->kind || tag->name != name) continue;
+      Layout layout;
+      FoundDirectory found = parser.Directory(layout);
+      if (!parser.AtEnd()) throw StructureError(parser.At(), "text after the directory's end");
+      std::string_view header = text.substr(0, at);
+      const std::string_view newline = crlf ? "\r\n" : "\n";
+      if (header.ends_with(newline)) header.remove_suffix(newline.size());
+      return {std::string(header), crlf, layout.ToShape(), std::move(found)};
+    } catch (const StructureError& error) {
+      if (!furthest || error.offset() > furthest->offset()) furthest = error;
+    }
+  }
+  if (furthest) throw *furthest;
+  throw StructureError(close, "no opening tag for the closing tag </" + std::string(name) + ">");
+}
+
+}  // namespace datapack
