@@ -1,0 +1,73 @@
+// The JSON form of a package, one shape for `show --json` and `pack`:
+//
+//   {"header": "...", "lineBreaks": "LF" | "CRLF", "encoding": "UTF-8" | "Latin-1",
+//    "directory": {"name": "Players",
+//                  "data": [{"name": "Score", "type": "Val"}, ...],
+//                  "directories": [<the same without "entries">, ...],
+//                  "entries": [{"values": [12.5, ...], "directories": [[<entry>, ...], ...]}]}}
+//
+// An entry has one value per data channel (Txt a string, Val a number, Vec three, Mat four rows of
+// four; "inf", "-inf", "nan" or "-nan" for numbers JSON cannot hold) and the entries of each
+// sub-directory.
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <stdexcept>
+#include <string>
+#include <string_view>
+
+#include "tools/datapack/package_model.h"
+
+namespace datapack {
+
+// Where a part of a package stands in its JSON form, and how a message names it.
+struct Place {
+  std::string pointer;  // JSON pointer
+  std::string path;     // "Players[3].Items", a name in brackets for entries
+
+  Place Key(std::string_view key) const { return {pointer + "/" + std::string(key), path}; }
+  Place Item(std::size_t index) const { return Key(std::to_string(index)); }
+  // An entry of the directory the path names.
+  Place Entry(std::size_t index) const {
+    return {pointer + "/" + std::to_string(index), path + "[" + std::to_string(index) + "]"};
+  }
+  // Long names are cut short in messages.
+  Place Named(std::string_view name) const {
+    constexpr std::size_t kShown = 40;
+    std::string shown(name.substr(0, kShown));
+    if (name.size() > kShown) shown += "...";
+    return {pointer, path.empty() ? shown : path + "." + shown};
+  }
+};
+
+inline constexpr std::string_view kHeaderKey = "header";
+inline constexpr std::string_view kDirectoryKey = "directory";
+inline constexpr std::string_view kNameKey = "name";
+inline constexpr std::string_view kDataKey = "data";
+inline constexpr std::string_view kDirectoriesKey = "directories";
+inline constexpr std::string_view kEntriesKey = "entries";
+inline constexpr std::string_view kValuesKey = "values";
+
+// A JSON text that does not describe a package. Either `offset` or a JSON pointer says where.
+class JsonError : public std::runtime_error {
+ public:
+  JsonError(std::string pointer, const std::string& message)
+      : std::runtime_error(message), pointer_(std::move(pointer)) {}
+  JsonError(std::size_t offset, const std::string& message)
+      : std::runtime_error(message), offset_(offset) {}
+
+  // The byte offset in `text` that the error is about.
+  std::size_t OffsetIn(std::string_view text) const;
+
+ private:
+  std::string pointer_;
+  std::optional<std::size_t> offset_;
+};
+
+std::string PackageToJson(const Package& package);
+
+// Throws JsonError.
+Package PackageFromJson(std::string_view text);
+
+}  // namespace datapack
