@@ -1,0 +1,37 @@
+// Reading a package as the engine receives it: the structure found in the text decides the channel
+// tree, the plug-in's reader fills it.
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "tools/datapack/format_limits.h"
+#include "tools/datapack/package_model.h"
+#include "tools/datapack/plugins.h"
+#include "tools/datapack/structure_finder.h"
+
+namespace datapack {
+
+struct ReadResult {
+  Package package;
+  FoundDirectory found;  // the entries the text holds, read or not
+};
+
+// Throws StructureError when the text does not hold a package.
+ReadResult ReadPackage(const Plugins& plugins, std::string_view text);
+
+// Where the text holds another number of entries than the reader took.
+struct Shortfall {
+  std::size_t offset;
+  std::string message;
+};
+std::vector<Shortfall> FindShortfalls(const ReadResult& result);
+
+// Whether `written`, the package of `package`, reads back and writes again to the same bytes; if
+// not, the first value of `package` that does not come back.
+std::optional<Problem> CheckReadBack(const Plugins& plugins, const Package& package,
+                                     const std::string& written);
+
+}  // namespace datapack
