@@ -1,5 +1,5 @@
-// The package demo: an engine-side host loads the DataDirectory plug-in by its GUID file name,
-// packs a small tree, scrambles the package and reads it back into a second tree.
+#include "tools/datapack/demo.h"
+
 #include <cstdio>
 #include <string>
 #include <vector>
@@ -9,6 +9,7 @@
 #include "host/value_channel.h"
 #include "plugin/data_package.h"
 
+namespace datapack {
 namespace {
 
 using Link = Lum_DataPackage::Link;
@@ -72,13 +73,6 @@ class PlayersTree {
   Lum_CallbackChannel callEachIteration_;
 };
 
-std::shared_ptr<ChannelLibrary> Load(const GUID& type) {
-  std::string error;
-  auto library = ChannelLibrary::Open(ExecutableFolder(), type, error);
-  if (!library) std::fprintf(stderr, "datadirectory_demo: %s\n", error.c_str());
-  return library;
-}
-
 void PrintText(const std::string& text) {
   std::size_t start = 0;
   for (;;) {
@@ -99,17 +93,16 @@ void PrintBytes(const std::vector<char>& bytes, std::size_t count) {
 
 }  // namespace
 
-int main() {
-  const auto directories = Load(kDataDirectoryGuid);
-  const auto texts = Load(kStringChannelGuid);
-  if (!directories || !texts) return 1;
-  const ChannelType& type = directories->Type();
-  std::printf("Plug-in     %s\n", directories->Path().c_str());
+void RunDemo(const Plugins& plugins) {
+  const ChannelLibrary& directories = *plugins.directories;
+  const ChannelLibrary& texts = *plugins.texts;
+  const ChannelType& type = directories.Type();
+  std::printf("Plug-in     %s\n", directories.Path().c_str());
   std::printf("Type        %s, %s, code %d\n\n", type.typeName, GuidToString(type.typeGuid).c_str(),
               static_cast<int>(type.typeCode));
 
   const std::vector<PlayerEntry> players = {{"Ann", 12.5f}, {"Bob", 7.0f}};
-  PlayersTree writer(*directories, *texts);
+  PlayersTree writer(directories, texts);
   writer.Supply(players);
   const int size = writer.Directory().WriteToBuffer(nullptr, 0, true, false);
   std::vector<char> package(static_cast<std::size_t>(size));
@@ -122,7 +115,7 @@ int main() {
   PrintBytes(package, 24);
 
   std::vector<PlayerEntry> received;
-  PlayersTree reader(*directories, *texts);
+  PlayersTree reader(directories, texts);
   reader.Collect(received);
   const int advanced = reader.Directory().ReadFromBuffer(package.data(), size, true, true);
   std::printf("\nRead back   %d bytes unscrambled and read, Count now %g\n", advanced,
@@ -132,5 +125,6 @@ int main() {
     std::printf("  %-6zu %-8s %g\n", i, received[i].name.c_str(),
                 static_cast<double>(received[i].score));
   }
-  return 0;
 }
+
+}  // namespace datapack
