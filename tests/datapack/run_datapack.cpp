@@ -61,7 +61,12 @@ RunResult RunDatapack(const std::vector<std::string>& arguments, const std::stri
   const fs::path folder = Folder() / "run";
   fs::create_directories(folder);
   WriteBytes(folder / "in", input);
-  std::string command = Quoted((fs::path(ExecutableFolder()) / "datapack").string());
+#if defined(_WIN32)
+  const char* const program = "datapack.exe";
+#else
+  const char* const program = "datapack";
+#endif
+  std::string command = Quoted((fs::path(ExecutableFolder()) / program).string());
   for (const std::string& argument : arguments)
     command += " " + Quoted(argument);
   command += " <" + Quoted((folder / "in").string()) + " >" + Quoted((folder / "out").string()) +

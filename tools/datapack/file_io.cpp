@@ -14,6 +14,7 @@
 #if defined(_WIN32)
 #include <io.h>
 #include <process.h>
+#include <windows.h>
 #define DATAPACK_OPEN _open
 #define DATAPACK_WRITE _write
 #define DATAPACK_CLOSE _close
@@ -126,7 +127,14 @@ void WriteOutput(const std::string& path, std::string_view bytes) {
     Fail("write", path, reason);
   }
   std::error_code renamed;
+#if defined(_WIN32)
+  // Windows renames onto an existing file only when asked to replace it.
+  if (!MoveFileExW(temporary.c_str(), target.c_str(), MOVEFILE_REPLACE_EXISTING)) {
+    renamed = std::error_code(static_cast<int>(GetLastError()), std::system_category());
+  }
+#else
   std::filesystem::rename(temporary, target, renamed);
+#endif
   if (renamed) {
     std::error_code ignored;
     std::filesystem::remove(temporary, ignored);
