@@ -9,18 +9,18 @@ namespace datapack {
 namespace {
 
 void FindShortfalls(const FoundDirectory& found, const Shape& shape,
-                    const std::vector<Entry>& entries, const std::string& path,
+                    const std::vector<Entry>& entries, const Place& place,
                     std::vector<Shortfall>& out) {
   if (found.entries.size() != entries.size()) {
     out.push_back({found.offset, "the text holds " + std::to_string(found.entries.size()) +
-                                     " entries of " + path + ", the reader takes " +
+                                     " entries of " + place.path + ", the reader takes " +
                                      std::to_string(entries.size())});
   }
   for (std::size_t i = 0; i < std::min(found.entries.size(), entries.size()); ++i) {
     for (std::size_t k = 0; k < shape.directories.size(); ++k) {
       const Shape& sub = shape.directories[k];
       FindShortfalls(found.entries[i][k], sub, entries[i].directories[k],
-                     path + "[" + std::to_string(i) + "]." + sub.name, out);
+                     place.Entry(i).Named(sub.name), out);
     }
   }
 }
@@ -101,8 +101,8 @@ ReadResult ReadPackage(const Plugins& plugins, std::string_view text) {
 
 std::vector<Shortfall> FindShortfalls(const ReadResult& result) {
   std::vector<Shortfall> shortfalls;
-  FindShortfalls(result.found, result.package.top, result.package.entries, result.package.top.name,
-                 shortfalls);
+  FindShortfalls(result.found, result.package.top, result.package.entries,
+                 Place{"", ""}.Named(result.package.top.name), shortfalls);
   return shortfalls;
 }
 
