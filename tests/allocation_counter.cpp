@@ -1,5 +1,7 @@
 #include "tests/allocation_counter.h"
 
+#include <malloc.h>
+
 #include <atomic>
 #include <cstdlib>
 #include <new>
@@ -18,11 +20,33 @@
 namespace {
 
 std::atomic<std::size_t> allocations{0};
+std::atomic<std::size_t> liveBytes{0};
+std::atomic<std::size_t> peakBytes{0};
 std::atomic<bool> failNothrow{false};
+
+std::size_t BlockSize(void* block) {
+#if defined(_WIN32)
+  return _msize(block);
+#else
+  return malloc_usable_size(block);
+#endif
+}
 
 void* Allocate(std::size_t size) {
   ++allocations;
-  return std::malloc(size ? size : 1);
+  void* block = std::malloc(size ? size : 1);
+  if (block) {
+    const std::size_t live = liveBytes += BlockSize(block);
+    std::size_t peak = peakBytes.load(std::memory_order_relaxed);
+    while (live > peak && !peakBytes.compare_exchange_weak(peak, live)) {
+    }
+  }
+  return block;
+}
+
+void Release(void* block) {
+  if (block) liveBytes -= BlockSize(block);
+  std::free(block);
 }
 
 #if defined(_WIN32)
@@ -130,6 +154,11 @@ struct ShareReplacementsWithLoadedLibraries {
 namespace allocation_counter {
 
 std::size_t Count() { return allocations.load(); }
+std::size_t LiveBytes() { return liveBytes.load(); }
+std::size_t PeakBytes() { return peakBytes.load(); }
+void ResetPeak() { peakBytes = liveBytes.load(); }
+void* Allocate(std::size_t size) { return ::Allocate(size); }
+void Release(void* block) { ::Release(block); }
 
 FailNothrowAllocations::FailNothrowAllocations() { failNothrow = true; }
 FailNothrowAllocations::~FailNothrowAllocations() { failNothrow = false; }
@@ -152,9 +181,9 @@ void* operator new[](std::size_t size, const std::nothrow_t& tag) noexcept {
   return ::operator new(size, tag);
 }
 
-void operator delete(void* block) noexcept { std::free(block); }
-void operator delete[](void* block) noexcept { std::free(block); }
-void operator delete(void* block, std::size_t) noexcept { std::free(block); }
-void operator delete[](void* block, std::size_t) noexcept { std::free(block); }
-void operator delete(void* block, const std::nothrow_t&) noexcept { std::free(block); }
-void operator delete[](void* block, const std::nothrow_t&) noexcept { std::free(block); }
+void operator delete(void* block) noexcept { Release(block); }
+void operator delete[](void* block) noexcept { Release(block); }
+void operator delete(void* block, std::size_t) noexcept { Release(block); }
+void operator delete[](void* block, std::size_t) noexcept { Release(block); }
+void operator delete(void* block, const std::nothrow_t&) noexcept { Release(block); }
+void operator delete[](void* block, const std::nothrow_t&) noexcept { Release(block); }

@@ -11,6 +11,18 @@ namespace allocation_counter {
 // allocates is compiled into our own modules, and those calls are.
 std::size_t Count();
 
+// Heap bytes those allocations hold now, and the most they held since the last ResetPeak(), each
+// block counted at the size the C library reserved for it. Exact where every block is released
+// through these replacements too, as on ELF systems.
+std::size_t LiveBytes();
+std::size_t PeakBytes();
+void ResetPeak();
+
+// Counted as operator new and delete are, for libraries that take a pair of C allocation
+// functions.
+void* Allocate(std::size_t size);
+void Release(void* block);
+
 // While alive, every nothrow allocation fails.
 class FailNothrowAllocations {
  public:
