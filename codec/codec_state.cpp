@@ -35,6 +35,30 @@ void Lum_DataPackage::SetBuffer(char* buffer, unsigned int size) {
   ForgetSearches();
 }
 
+namespace {
+
+// Most pieces are a few bytes long: copied by fixed-size moves, which need no call, that overlap
+// where the piece is shorter than two of them.
+char* CopyPiece(std::string_view piece, char* out) {
+  const char* in = piece.data();
+  const std::size_t size = piece.size();
+  if (size >= 16) {
+    std::memcpy(out, in, size);
+  } else if (size >= 8) {
+    std::memcpy(out, in, 8);
+    std::memcpy(out + size - 8, in + size - 8, 8);
+  } else if (size >= 4) {
+    std::memcpy(out, in, 4);
+    std::memcpy(out + size - 4, in + size - 4, 4);
+  } else {
+    for (std::size_t i = 0; i < size; ++i)
+      out[i] = in[i];
+  }
+  return out + size;
+}
+
+}  // namespace
+
 // Reading stops at the first NUL, and never looks past bufferEnd for one.
 void Lum_DataPackage::EndTextAtNul() {
   const auto size = static_cast<std::size_t>(bufferEnd - bufferStart);
@@ -62,7 +86,7 @@ void Lum_DataPackage::AppendPieces(std::initializer_list<std::string_view> piece
   if (end < bufferEnd - bufferStart) {
     char* out = bufferStart + bufferCursor;
     for (std::string_view piece : pieces)
-      out = std::copy(piece.begin(), piece.end(), out);
+      out = CopyPiece(piece, out);
     *out = '\0';
   }
   bufferCursor = static_cast<int>(std::min<long long>(end, INT_MAX - 1));
@@ -77,6 +101,15 @@ const char* Lum_DataPackage::GetTabs() {
 }
 
 const char* Lum_DataPackage::GetNewline() {
-  std::strcpy(newlineBuffer, fileNoTxtChan ? "\n" : "\r\n");
+  newlineBuffer[0] = fileNoTxtChan ? '\n' : '\r';
+  newlineBuffer[1] = fileNoTxtChan ? '\0' : '\n';
+  newlineBuffer[2] = '\0';
   return newlineBuffer;
+}
+
+// GetNewline and GetTabs with their lengths, as the element writers put them together.
+std::string_view Lum_DataPackage::Newline() { return {GetNewline(), fileNoTxtChan ? 1u : 2u}; }
+
+std::string_view Lum_DataPackage::Indentation() {
+  return {GetTabs(), static_cast<std::size_t>(std::clamp(treeDepth, 0, kMaxTabs))};
 }

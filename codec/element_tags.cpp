@@ -29,7 +29,7 @@ std::string_view FormatFloats(const float* values, int count, char* out) {
 
 bool Lum_DataPackage::XML_OpeningTag(const char* name) {
   if (write) {
-    AppendPieces({GetNewline(), GetTabs(), "<", name, ">"});
+    AppendPieces({Newline(), Indentation(), "<", name, ">"});
   } else {
     do {
       MoveCursorAfter("<");
@@ -45,7 +45,7 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
   if (write) {
     char number[12];
     const std::string_view idText(number, numbers::FormatInt(id, number));
-    AppendPieces({GetNewline(), GetTabs(), "<", name, " id=\"", idText, "\">"});
+    AppendPieces({Newline(), Indentation(), "<", name, " id=\"", idText, "\">"});
     ++treeDepth;
     return true;
   }
@@ -68,7 +68,7 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
 void Lum_DataPackage::XML_ClosingTag(const char* name) {
   --treeDepth;
   if (write) {
-    AppendPieces({GetNewline(), GetTabs(), "</", name, ">"});
+    AppendPieces({Newline(), Indentation(), "</", name, ">"});
     return;
   }
   do {
@@ -78,10 +78,10 @@ void Lum_DataPackage::XML_ClosingTag(const char* name) {
   } while (tmp2[0] != '\0' && std::strcmp(tmp2, name) != 0);
 }
 
-void Lum_DataPackage::WriteTypedElement(const char* name, std::string_view type,
+void Lum_DataPackage::WriteTypedElement(std::string_view name, std::string_view type,
                                         std::string_view value) {
   AppendPieces(
-      {GetNewline(), GetTabs(), "<", name, " Type=\"", type, "\"> ", value, " </", name, ">"});
+      {Newline(), Indentation(), "<", name, " Type=\"", type, "\"> ", value, " </", name, ">"});
 }
 
 // Reading: takes the element at the next "<" when its name is `name`, leaving the cursor just

@@ -32,26 +32,32 @@ Lum_DataPackage::DelimiterMemo* Lum_DataPackage::MemoFor(std::string_view patter
   }
 }
 
-// The first occurrence at or after the cursor that lies wholly inside the text. Readers search
-// for the same few delimiters from cursors that mostly move forward; remembering the last answer
-// for each keeps a missing or far delimiter from being searched for over and over.
+// The first occurrence at or after the cursor that lies wholly inside the text. Most delimiters
+// stand a few bytes ahead. Beyond that, readers search for the same few delimiters from cursors
+// that mostly move forward; remembering the last answer for each keeps a missing or far delimiter
+// from being searched for over and over.
 const char* Lum_DataPackage::Find(std::string_view pattern) {
+  constexpr std::ptrdiff_t kNear = 64;
+  const char* const from = bufferStart + bufferCursor;
+  if (static_cast<std::size_t>(textEnd - from) < pattern.size()) return nullptr;
+  const char* const lastStart = textEnd - pattern.size() + 1;
+  // The first occurrence in [p, end), or null.
+  const auto search = [pattern](const char* p, const char* end) -> const char* {
+    while (p < end) {
+      p = static_cast<const char*>(std::memchr(p, pattern[0], static_cast<std::size_t>(end - p)));
+      if (!p || std::equal(pattern.begin() + 1, pattern.end(), p + 1)) return p;
+      ++p;
+    }
+    return nullptr;
+  };
+  const char* const near = from + std::min(kNear, lastStart - from);
+  if (const char* found = search(from, near)) return found;
+
   DelimiterMemo* memo = MemoFor(pattern);
   if (memo && memo->from <= bufferCursor && (memo->found < 0 || bufferCursor <= memo->found)) {
     return memo->found < 0 ? nullptr : bufferStart + memo->found;
   }
-  const char* found = nullptr;
-  const char* from = bufferStart + bufferCursor;
-  if (static_cast<std::size_t>(textEnd - from) >= pattern.size()) {
-    const char* const lastStart = textEnd - pattern.size() + 1;
-    while (from < lastStart) {
-      from = static_cast<const char*>(
-          std::memchr(from, pattern[0], static_cast<std::size_t>(lastStart - from)));
-      if (!from || std::equal(pattern.begin() + 1, pattern.end(), from + 1)) break;
-      ++from;
-    }
-    found = from < lastStart ? from : nullptr;
-  }
+  const char* const found = search(near, lastStart);
   if (memo) *memo = {bufferCursor, found ? static_cast<int>(found - bufferStart) : -1};
   return found;
 }

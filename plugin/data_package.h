@@ -57,6 +57,8 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   static void AppendPieces(std::initializer_list<std::string_view> pieces);
   static const char* GetTabs();
   static const char* GetNewline();
+  static std::string_view Newline();
+  static std::string_view Indentation();
 
   // Scanning.
   struct DelimiterMemo;
@@ -80,7 +82,8 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   static void XML_ValueTag(const char* name, float& value);
   static void XML_VectorTag(const char* name, D3DXVECTOR3& vector);
   static void XML_MatrixTag(const char* name, D3DXMATRIX& matrix);
-  static void WriteTypedElement(const char* name, std::string_view type, std::string_view value);
+  static void WriteTypedElement(std::string_view name, std::string_view type,
+                                std::string_view value);
   static bool ReadTypedElementName(const char* name);
   static bool IsPlainName(std::string_view name);
 

@@ -3,7 +3,7 @@
 #include "host/engine_trace.h"
 #include "host/guid.h"
 
-Lum_StringChannel::Lum_StringChannel() : wideText_{0} {
+Lum_StringChannel::Lum_StringChannel() {
   SetChannelType(MakeChannelType("Text", kStringChannelGuid, kStringChannelGuid, 1));
 }
 
@@ -26,8 +26,7 @@ const char* Lum_StringChannel::GetString() { return text_.c_str(); }
 
 void Lum_StringChannel::SetString(const char* text) {
   text_ = text ? text : "";
-  wideText_.assign(text_.size() + 1, 0);
-  AS2WS(wideText_.data(), text_.c_str());
+  wideTextCurrent_ = false;
   SetTimeStamp();
   textStamp_ = Vorn_Channel::GetTimeStamp();
   TraceEngineCall(*this, "SetString", static_cast<int>(text_.size()));
@@ -42,7 +41,15 @@ void Lum_StringChannel::SetMaxCars(int maxChars) { maxChars_ = maxChars; }
 void Lum_StringChannel::SetIfUseWChar(bool useWideChars) { useWideChars_ = useWideChars; }
 bool Lum_StringChannel::GetIfUseWChar() { return useWideChars_; }
 
-const unsigned short* Lum_StringChannel::GetWString() { return wideText_.data(); }
+// The wide text is made when first asked for: most texts are only ever read as 8-bit ones.
+const unsigned short* Lum_StringChannel::GetWString() {
+  if (!wideTextCurrent_) {
+    wideText_.assign(text_.size() + 1, 0);
+    AS2WS(wideText_.data(), text_.c_str());
+    wideTextCurrent_ = true;
+  }
+  return wideText_.data();
+}
 
 void Lum_StringChannel::SetWString(const unsigned short* wide) {
   std::size_t length = 0;

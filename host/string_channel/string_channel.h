@@ -43,7 +43,8 @@ class STRING_CHANNEL_API Lum_StringChannel : public Vorn_Channel {
 
  private:
   std::string text_;
-  std::vector<unsigned short> wideText_;  // NUL-terminated, kept in step with text_
+  std::vector<unsigned short> wideText_;  // NUL-terminated, made from text_ when asked for
+  bool wideTextCurrent_ = false;
   bool singleLine_ = false;
   bool useWideChars_ = false;
   int maxChars_ = 0;
