@@ -31,11 +31,12 @@ bool Lum_DataPackage::XML_OpeningTag(const char* name) {
   if (write) {
     AppendPieces({Newline(), Indentation(), "<", name, ">"});
   } else {
+    std::string_view content;
     do {
       MoveCursorAfter("<");
-      CutStringBefore(">", tmp2);
+      content = TextBefore(">");
       MoveCursorAfter(">");
-    } while (tmp2[0] != '\0' && std::strncmp(tmp2, name, std::strlen(name)) != 0);
+    } while (!content.empty() && !content.starts_with(name));
   }
   ++treeDepth;
   return true;
@@ -51,13 +52,13 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
   }
   const int start = bufferCursor;
   const std::size_t nameLength = std::strlen(name);
+  std::string_view head;  // the tag's content, cut to the name's length
   do {
     MoveCursorAfter("<");
-    CutStringBefore(">", tmp2);
+    head = TextBefore(">").substr(0, nameLength);
     MoveCursorAfter(">");
-    if (std::strlen(tmp2) > nameLength) tmp2[nameLength] = '\0';
-  } while (id == 0 && tmp2[0] != '\0' && std::strcmp(tmp2, name) != 0);
-  if (std::strcmp(tmp2, name) != 0) {
+  } while (id == 0 && !head.empty() && head != name);
+  if (head != name) {
     bufferCursor = start;
     return false;
   }
@@ -71,11 +72,12 @@ void Lum_DataPackage::XML_ClosingTag(const char* name) {
     AppendPieces({Newline(), Indentation(), "</", name, ">"});
     return;
   }
+  std::string_view content;
   do {
     MoveCursorAfter("</");
-    CutStringBefore(">", tmp2);
+    content = TextBefore(">");
     MoveCursorAfter(">");
-  } while (tmp2[0] != '\0' && std::strcmp(tmp2, name) != 0);
+  } while (!content.empty() && content != name);
 }
 
 void Lum_DataPackage::WriteTypedElement(std::string_view name, std::string_view type,

@@ -83,18 +83,24 @@ char* Lum_DataPackage::GetStringBefore(const char* delimiter) {
 // Cuts out the trimmed text before the next delimiter into `text` (kTextLength chars). Text too
 // long for it cuts out as the empty string, as does a missing delimiter.
 void Lum_DataPackage::CutStringBefore(std::string_view delimiter, char* text) {
-  text[0] = '\0';
+  const std::string_view cut = TextBefore(delimiter);
+  std::copy(cut.begin(), cut.end(), text);
+  text[cut.size()] = '\0';
+}
+
+// What CutStringBefore cuts out, left where it stands; the cursor moves the same way. Readers that
+// only compare a tag's content with a name need no copy of it.
+std::string_view Lum_DataPackage::TextBefore(std::string_view delimiter) {
   const char* end = Find(delimiter);
-  if (!end) return;
+  if (!end) return {};
   const char* const begin = SkipWhiteSpace(bufferStart + bufferCursor);
   bufferCursor = static_cast<int>(begin - bufferStart);
   while (end > begin && IsWhiteSpace(end[-1]))
     --end;
   const std::size_t length = static_cast<std::size_t>(end - begin);
-  if (length == 0 || length >= kTextLength) return;
-  std::memcpy(text, begin, length);
-  text[length] = '\0';
+  if (length == 0 || length >= kTextLength) return {};
   bufferCursor = static_cast<int>(end - bufferStart);
+  return {begin, length};
 }
 
 const char* Lum_DataPackage::SkipWhiteSpace(const char* p) {
@@ -120,6 +126,15 @@ bool Lum_DataPackage::MoveCursorBeforeTag(const char* name) {
 // on from the same place. So every tag from a failed search's second on fails for any search.
 bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
   const int start = bufferCursor;
+  // A tag that matches holds the name: where the name occurs nowhere ahead, no tag does.
+  if (failsFrom > start) {
+    const std::string_view rest(bufferStart + start,
+                                static_cast<std::size_t>(textEnd - bufferStart - start));
+    if (rest.find(name) == std::string_view::npos) {
+      failsFrom = start;
+      return false;
+    }
+  }
   int secondTag = -1;
   for (bool first = true;; first = false) {
     const int before = bufferCursor;
@@ -133,14 +148,14 @@ bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
       return false;
     }
     if (!first && secondTag < 0) secondTag = tag;
-    CutStringBefore(">", tmp2);
-    bool found = std::strcmp(tmp2, name) == 0;
+    std::string_view content = TextBefore(">");
+    bool found = content == name;
     if (!found) {
-      if (char* id = std::strstr(tmp2, kIdAttribute.data())) {
-        while (id > tmp2 && IsWhiteSpace(id[-1]))
+      // The name followed by an id attribute: cut at the whitespace before the first 'id="'.
+      if (std::size_t id = content.find(kIdAttribute); id != std::string_view::npos) {
+        while (id > 0 && IsWhiteSpace(content[id - 1]))
           --id;
-        *id = '\0';
-        found = std::strcmp(tmp2, name) == 0;
+        found = content.substr(0, id) == name;
       }
     }
     if (found) {
@@ -178,8 +193,7 @@ int Lum_DataPackage::GetItemType(const char* name) {
       type = 1;
       if (rest().starts_with("</")) {
         skip(2);
-        CutStringBefore(">", tmp2);
-        if (StartsWith(tmp2, name)) type = 3;
+        if (StartsWith(TextBefore(">"), name)) type = 3;
       }
     }
   }

@@ -68,6 +68,7 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   static void MoveCursorAfter(std::string_view pattern);
   static char* GetStringBefore(const char* delimiter);
   static void CutStringBefore(std::string_view delimiter, char* text);
+  static std::string_view TextBefore(std::string_view delimiter);
   static bool IsWhiteSpace(char c);
   static const char* SkipWhiteSpace(const char* p);
   static bool MoveCursorBeforeTag(const char* name);

@@ -33,7 +33,6 @@ class DataPackageTestAccess {
   static int& TreeDepth() { return Package::treeDepth; }
   static bool& LineFeeds() { return Package::fileNoTxtChan; }
   static char* Tmp() { return Package::tmp; }
-  static const char* Tmp2() { return Package::tmp2; }
   static const char* BufferEnd() { return Package::bufferEnd; }
 
   static int BufferAppend(int length) { return Package::BufferAppend(length); }
