@@ -50,14 +50,14 @@ const char* Lum_DataPackage::Find(std::string_view pattern) {
     }
     return nullptr;
   };
-  const char* const near = from + std::min(kNear, lastStart - from);
-  if (const char* found = search(from, near)) return found;
+  const char* const nearEnd = from + std::min(kNear, lastStart - from);
+  if (const char* found = search(from, nearEnd)) return found;
 
   DelimiterMemo* memo = MemoFor(pattern);
   if (memo && memo->from <= bufferCursor && (memo->found < 0 || bufferCursor <= memo->found)) {
     return memo->found < 0 ? nullptr : bufferStart + memo->found;
   }
-  const char* const found = search(near, lastStart);
+  const char* const found = search(nearEnd, lastStart);
   if (memo) *memo = {bufferCursor, found ? static_cast<int>(found - bufferStart) : -1};
   return found;
 }
