@@ -20,18 +20,18 @@ constexpr std::string_view kNameLetters =
     "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789_.-";
 enum Kind { kText, kValue, kVector, kMatrix, kOther, kEmptyPosition, kKinds };
 
-struct DataSpec {
+struct DataShape {
   Kind kind;
   std::string name;
 };
 
-struct DirectorySpec {
+struct DirectoryShape {
   std::string name;  // empty: no Tag child
-  std::vector<DataSpec> data;
+  std::vector<DataShape> data;
   std::vector<int> subs;  // indices into the list of directories; -1 for an empty position
 
   bool HoldsNothing() const {
-    for (const DataSpec& data : data) {
+    for (const DataShape& data : data) {
       if (data.kind < kOther) return false;
     }
     for (int sub : subs) {
@@ -42,19 +42,19 @@ struct DirectorySpec {
 };
 
 // Names are unique and none begins with another: the format cannot tell such directories apart.
-int Describe(FuzzInput& input, std::vector<DirectorySpec>& specs, int depth) {
-  const int index = static_cast<int>(specs.size());
-  specs.push_back({"D" + std::to_string(index) + "_" + input.Text(6, kNameLetters), {}, {}});
+int Describe(FuzzInput& input, std::vector<DirectoryShape>& shapes, int depth) {
+  const int index = static_cast<int>(shapes.size());
+  shapes.push_back({"D" + std::to_string(index) + "_" + input.Text(6, kNameLetters), {}, {}});
   const int data = input.Below(4);
   for (int i = 0; i < data; ++i) {
     const auto kind = static_cast<Kind>(input.Below(kKinds - 1));
-    specs[index].data.push_back({kind, "v" + std::to_string(index) + "_" + std::to_string(i) +
-                                           input.Text(4, kNameLetters)});
+    shapes[index].data.push_back({kind, "v" + std::to_string(index) + "_" + std::to_string(i) +
+                                            input.Text(4, kNameLetters)});
   }
   const int subs = depth < 3 ? input.Below(2) : 0;
   for (int i = 0; i < subs; ++i) {
-    const int sub = input.Below(5) == 0 ? -1 : Describe(input, specs, depth + 1);
-    specs[index].subs.push_back(sub);
+    const int sub = input.Below(5) == 0 ? -1 : Describe(input, shapes, depth + 1);
+    shapes[index].subs.push_back(sub);
   }
   return index;
 }
@@ -93,8 +93,9 @@ std::string CarriedText(FuzzInput& input) {
 // One tree of the description: its channels, and per directory the entries it wrote or read.
 class Twin {
  public:
-  explicit Twin(const std::vector<DirectorySpec>& specs) : specs_(specs), nodes_(specs.size()) {
-    for (std::size_t i = 0; i < specs.size(); ++i)
+  explicit Twin(const std::vector<DirectoryShape>& shapes)
+      : shapes_(shapes), nodes_(shapes.size()) {
+    for (std::size_t i = 0; i < shapes.size(); ++i)
       Build(static_cast<int>(i));
     AttachSubDirectories();
   }
@@ -133,13 +134,13 @@ class Twin {
   };
 
   void Build(int index) {
-    const DirectorySpec& spec = specs_[index];
+    const DirectoryShape& shape = shapes_[index];
     Node& node = nodes_[index];
-    node.directory = tree_.Directory(spec.name.c_str());
+    node.directory = tree_.Directory(shape.name.c_str());
     node.count = tree_.Attach(node.directory, Link::kCountLink, tree_.Make<Lum_ValueChannel>());
     node.callEachIteration = tree_.Attach(node.directory, Link::kCallEachIterationLink,
                                           tree_.Make<Lum_CallbackChannel>());
-    for (const DataSpec& data : spec.data) {
+    for (const DataShape& data : shape.data) {
       Vorn_Channel* channel = nullptr;
       switch (data.kind) {
         case kText:
@@ -171,9 +172,9 @@ class Twin {
 
   // Once every directory exists: sub-directories, with their empty positions.
   void AttachSubDirectories() {
-    for (std::size_t i = 0; i < specs_.size(); ++i) {
-      for (std::size_t j = 0; j < specs_[i].subs.size(); ++j) {
-        const int sub = specs_[i].subs[j];
+    for (std::size_t i = 0; i < shapes_.size(); ++i) {
+      for (std::size_t j = 0; j < shapes_[i].subs.size(); ++j) {
+        const int sub = shapes_[i].subs[j];
         if (!nodes_[i].directory->SetChildAtLinkPosition(
                 Link::kSubDirectoriesLink, static_cast<int>(j),
                 sub >= 0 ? nodes_[static_cast<std::size_t>(sub)].directory : nullptr)) {
@@ -184,11 +185,11 @@ class Twin {
   }
 
   void SupplyEntry(std::size_t index, FuzzInput& values) {
-    const DirectorySpec& spec = specs_[index];
+    const DirectoryShape& shape = shapes_[index];
     Node& node = nodes_[index];
-    for (std::size_t j = 0; j < spec.data.size(); ++j) {
+    for (std::size_t j = 0; j < shape.data.size(); ++j) {
       Vorn_Channel* channel = node.data[j];
-      switch (spec.data[j].kind) {
+      switch (shape.data[j].kind) {
         case kText:
           static_cast<Lum_StringChannel*>(channel)->SetString(CarriedText(values).c_str());
           break;
@@ -212,21 +213,21 @@ class Twin {
           break;
       }
     }
-    for (int sub : spec.subs) {
+    for (int sub : shape.subs) {
       if (sub >= 0) nodes_[sub].count->SetValue(static_cast<float>(values.Below(3)));
     }
     // An entry that holds nothing is written like an empty directory, and read as one.
-    if (!(spec.HoldsNothing() && node.count->GetValue() == 1.0f)) {
+    if (!(shape.HoldsNothing() && node.count->GetValue() == 1.0f)) {
       node.entries.push_back(Record(index, true));
     }
   }
 
   std::string Record(std::size_t index, bool carried) {
-    const DirectorySpec& spec = specs_[index];
+    const DirectoryShape& shape = shapes_[index];
     std::string record;
-    for (std::size_t j = 0; j < spec.data.size(); ++j) {
+    for (std::size_t j = 0; j < shape.data.size(); ++j) {
       Vorn_Channel* channel = nodes_[index].data[j];
-      switch (spec.data[j].kind) {
+      switch (shape.data[j].kind) {
         case kText: {
           const char* text = static_cast<Lum_StringChannel*>(channel)->GetString();
           record += std::string(text) + '\0';
@@ -257,7 +258,7 @@ class Twin {
     return record;
   }
 
-  const std::vector<DirectorySpec>& specs_;
+  const std::vector<DirectoryShape>& shapes_;
   FuzzTree tree_;
   std::vector<Node> nodes_;
 };
@@ -266,9 +267,9 @@ class Twin {
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   FuzzInput input(data, size);
-  std::vector<DirectorySpec> specs;
-  Describe(input, specs, 0);
-  if (input.Flag()) specs[0].name.clear();  // the top may go without a Tag: "Noname"
+  std::vector<DirectoryShape> shapes;
+  Describe(input, shapes, 0);
+  if (input.Flag()) shapes[0].name.clear();  // the top may go without a Tag: "Noname"
   const bool lineFeeds = input.Flag();
   const bool scramble = input.Flag();
   const int topCount = input.Below(3);
@@ -277,7 +278,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     c = c == '<' ? '(' : c;
   const std::string_view values = input.Rest();
 
-  Twin writer(specs);
+  Twin writer(shapes);
   Lum_DataPackage& top = writer.Top();
   top.SetString(header.c_str());
   writer.TopCount().SetValue(static_cast<float>(topCount));
@@ -294,10 +295,10 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   Check(top.WriteToBuffer(buffer.get(), required, lineFeeds, scramble) == required,
         "the second pass needs another size");
 
-  Twin reader(specs);
+  Twin reader(shapes);
   reader.Collect();
   reader.Top().ReadFromBuffer(buffer.get(), required, !lineFeeds, scramble);
-  for (std::size_t i = 0; i < specs.size(); ++i) {
+  for (std::size_t i = 0; i < shapes.size(); ++i) {
     Check(reader.Entries(static_cast<int>(i)) == writer.Entries(static_cast<int>(i)),
           "entries read differ from entries written");
   }
