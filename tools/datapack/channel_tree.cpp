@@ -174,12 +174,10 @@ std::string ChannelTree::Write(const std::string& header, const std::vector<Entr
   return buffer;
 }
 
-std::vector<Entry> ChannelTree::Read(std::string_view text, bool crlf) {
+std::vector<Entry> ChannelTree::Read(std::string& text, bool crlf) {
   if (text.size() >= INT_MAX) throw InputError("the package is too large to be read");
-  std::string buffer(text);
   top_->Collect();
-  top_->Directory().ReadFromBuffer(buffer.data(), static_cast<int>(buffer.size() + 1), !crlf,
-                                   false);
+  top_->Directory().ReadFromBuffer(text.data(), static_cast<int>(text.size() + 1), !crlf, false);
   return std::move(top_->collected);
 }
 

@@ -26,8 +26,9 @@ class ChannelTree {
   std::string Write(const std::string& header, const std::vector<Entry>& entries, bool crlf,
                     bool scramble);
 
-  // The entries the tree receives from reading the text.
-  std::vector<Entry> Read(std::string_view text, bool crlf);
+  // The entries the tree receives from reading the text, read where it stands: the reader only
+  // looks, and the string's own terminating NUL ends it.
+  std::vector<Entry> Read(std::string& text, bool crlf);
 
  private:
   struct Node;

@@ -1,7 +1,9 @@
 #include "tools/datapack/commands.h"
 
+#include <algorithm>
 #include <climits>
 #include <cstdio>
+#include <optional>
 #include <string_view>
 
 #include "plugin/data_package.h"
@@ -15,6 +17,9 @@
 #include "tools/datapack/package_reader.h"
 
 namespace datapack {
+
+std::string pluginDir;
+
 namespace {
 
 // The plug-in scrambles lengths an int can count.
@@ -22,22 +27,206 @@ void CheckScramblable(const std::string& bytes, const std::string& name) {
   if (bytes.size() >= INT_MAX) throw InputError(name + ": too large to scramble");
 }
 
-std::string At(const std::string& name, std::string_view text, std::size_t offset) {
-  return name + ":" + LineAndColumn(text, offset) + ": ";
+// Places in a text as messages give them. Line starts are found once, when first needed.
+class Places {
+ public:
+  Places(std::string name, std::string_view text) : name_(std::move(name)), text_(text) {}
+
+  std::string At(std::size_t offset) { return name_ + ":" + LineColumn(offset) + ": "; }
+
+  std::string LineColumn(std::size_t offset) {
+    if (starts_.empty()) {
+      starts_.push_back(0);
+      for (std::size_t at = text_.find('\n'); at != std::string_view::npos;
+           at = text_.find('\n', at + 1))
+        starts_.push_back(at + 1);
+    }
+    offset = std::min(offset, text_.size());
+    const auto line = std::upper_bound(starts_.begin(), starts_.end(), offset) - 1;
+    return std::to_string(line - starts_.begin() + 1) + ":" + std::to_string(offset - *line + 1);
+  }
+
+ private:
+  std::string name_;
+  std::string_view text_;
+  std::vector<std::size_t> starts_;
+};
+
+// A stored package as the engine's reader receives it.
+struct Loaded {
+  std::string name;
+  std::string text;          // unscrambled, cut at the first NUL
+  std::size_t afterNul = 0;  // the bytes past that NUL, which no reader sees
+  ReadResult result;
+};
+
+Loaded Load(const std::string& file, Scrambling scrambling, const Plugins& plugins) {
+  Loaded loaded;
+  loaded.name = StreamName(file, true);
+  loaded.text = ReadInput(file);
+  const bool scrambled = scrambling == Scrambling::kScrambled ||
+                         (scrambling == Scrambling::kDetect && LooksScrambled(loaded.text));
+  if (scrambled) {
+    CheckScramblable(loaded.text, loaded.name);
+    Lum_DataPackage::Decrypt(loaded.text.data(), static_cast<int>(loaded.text.size()));
+  }
+  const std::size_t nul = loaded.text.find('\0');
+  if (nul != std::string::npos) {
+    loaded.afterNul = loaded.text.size() - nul - 1;
+    loaded.text.resize(nul);  // the reader stops there
+  }
+  try {
+    loaded.result = ReadPackage(plugins, loaded.text);
+  } catch (const StructureError& error) {
+    Places places(loaded.name, loaded.text);
+    std::string message = places.At(error.offset()) + error.what();
+    if (nul != std::string::npos) {
+      message += " (the reader stops at the NUL byte at " + places.LineColumn(nul) + ")";
+    }
+    throw InputError(message);
+  }
+  loaded.result.package.scrambled = scrambled;
+  return loaded;
 }
 
-// Scrambled bytes are mostly not text; a plain package is.
-bool LooksScrambled(std::string_view text) {
-  for (char c : text) {
-    const auto byte = static_cast<unsigned char>(c);
-    if (byte < 0x20 && c != '\n' && c != '\r' && c != '\t') return true;
+// Findings of check, in the order met.
+struct Finding {
+  std::size_t offset;
+  bool warning;
+  std::string message;
+};
+
+std::vector<Finding> Findings(const Loaded& loaded, const Plugins& plugins) {
+  std::vector<Finding> findings;
+  for (const Note& note : loaded.result.notes)
+    findings.push_back({note.offset, note.warning, note.message});
+  for (const Shortfall& shortfall : FindShortfalls(loaded.result))
+    findings.push_back({shortfall.offset, false, shortfall.message});
+  const std::string_view text = loaded.text;
+  if (loaded.afterNul > 0) {
+    findings.push_back(
+        {text.size(), false,
+         Counted(loaded.afterNul, "byte", "bytes") + " after a NUL byte, where the reader stops"});
   }
-  return false;
+  // The reader takes either line break; writing again gives one kind only.
+  const std::size_t crlf = loaded.result.package.crlf;
+  for (std::size_t at = text.find('\n'); at != std::string_view::npos;
+       at = text.find('\n', at + 1)) {
+    const bool afterCr = at > 0 && text[at - 1] == '\r';
+    if (afterCr != static_cast<bool>(crlf)) {
+      findings.push_back({at, true,
+                          std::string("mixed line breaks: ") + (afterCr ? "CR LF" : "LF") +
+                              " in a package of " + (crlf ? "CR LF" : "LF") + " line breaks"});
+      break;
+    }
+  }
+  if (findings.empty()) {
+    const std::string again = WritePackage(plugins, loaded.result.package, false);
+    if (again != text) {
+      const std::size_t at = static_cast<std::size_t>(
+          std::mismatch(again.begin(), again.end(), text.begin(), text.end()).second -
+          text.begin());
+      findings.push_back({at, true,
+                          "written again, the package differs from here on (numbers written "
+                          "otherwise, or spacing)"});
+    }
+  }
+  std::stable_sort(findings.begin(), findings.end(),
+                   [](const Finding& a, const Finding& b) { return a.offset < b.offset; });
+  return findings;
 }
+
+std::string Path(const std::string& path, std::string_view name) {
+  const std::string shown = ShownName(name);
+  return path.empty() ? shown : path + "." + shown;
+}
+
+// The differences between two packages, by path.
+class Differ {
+ public:
+  explicit Differ(Output& out) : out_(out) {}
+  bool different = false;
+
+  void Report(const std::string& path, const std::string& before, const std::string& after) {
+    different = true;
+    out_ << path << ": " << before << " \u2192 " << after << "\n";
+  }
+
+  void Directory(const Shape& a, const std::vector<Entry>& aEntries, const Shape& b,
+                 const std::vector<Entry>& bEntries, const std::string& parent) {
+    const std::string path = Path(parent, a.name);
+    if (a.name != b.name) {
+      Report(path, "directory \"" + ShownName(a.name) + "\"",
+             "directory \"" + ShownName(b.name) + "\"");
+      return;
+    }
+    const std::size_t data = std::min(a.data.size(), b.data.size());
+    std::vector<bool> sameSlot(data);
+    for (std::size_t j = 0; j < std::max(a.data.size(), b.data.size()); ++j) {
+      const auto slot = [](const Shape& shape, std::size_t j) {
+        return j < shape.data.size() ? ShownName(shape.data[j].name) + " (" +
+                                           std::string(KindName(shape.data[j].kind)) + ")"
+                                     : std::string("nothing");
+      };
+      if (j < data && a.data[j] == b.data[j]) {
+        sameSlot[j] = true;
+      } else {
+        Report(path + ".data[" + std::to_string(j) + "]", slot(a, j), slot(b, j));
+      }
+    }
+    if (aEntries.size() != bEntries.size()) {
+      Report(path, Counted(aEntries.size(), "entry", "entries"),
+             Counted(bEntries.size(), "entry", "entries"));
+    }
+    for (std::size_t i = 0; i < std::min(aEntries.size(), bEntries.size()); ++i) {
+      const std::string entry = path + "[" + std::to_string(i) + "]";
+      for (std::size_t j = 0; j < data; ++j) {
+        if (!sameSlot[j]) continue;
+        const std::string before = ValueText(aEntries[i].values[j]);
+        const std::string after = ValueText(bEntries[i].values[j]);
+        if (before != after) Report(Path(entry, a.data[j].name), before, after);
+      }
+      const std::size_t subs = std::max(a.directories.size(), b.directories.size());
+      for (std::size_t k = 0; k < subs; ++k) {
+        if (k >= a.directories.size() || k >= b.directories.size()) {
+          const Shape& only = k < a.directories.size() ? a.directories[k] : b.directories[k];
+          Report(Path(entry, only.name), k < a.directories.size() ? "a directory" : "nothing",
+                 k < a.directories.size() ? "nothing" : "a directory");
+          continue;
+        }
+        Directory(a.directories[k], aEntries[i].directories[k], b.directories[k],
+                  bEntries[i].directories[k], entry);
+      }
+    }
+  }
+
+ private:
+  Output& out_;
+};
 
 }  // namespace
 
-void Demo() { RunDemo(LoadPlugins()); }
+bool LooksScrambled(std::string_view bytes) {
+  // Plain packages are text; scrambling shifts byte i by an amount that runs through every value
+  // from i = 12 on, so that about one byte in eight of a scrambled text lands among the control
+  // bytes. The first 268 bytes see every amount.
+  constexpr std::size_t kLooked = 268;
+  std::string start(bytes.substr(0, kLooked));
+  const auto controls = [](std::string_view text) {
+    return std::count_if(text.begin(), text.end(), [](char c) {
+      const auto byte = static_cast<unsigned char>(c);
+      return (byte < 0x20 && c != '\n' && c != '\r' && c != '\t') || byte == 0x7F;
+    });
+  };
+  const auto asItStands = controls(start);
+  Lum_DataPackage::Decrypt(start.data(), static_cast<int>(start.size()));
+  return controls(start) < asItStands;
+}
+
+void Demo(const DemoOptions& options) {
+  const std::string package = RunDemo(LoadPlugins(pluginDir));
+  if (!options.output.empty()) WriteOutput(options.output, package);
+}
 
 void Scramble(const ScrambleOptions& options) {
   std::string bytes = ReadInput(options.input);
@@ -48,31 +237,30 @@ void Scramble(const ScrambleOptions& options) {
   } else {
     Lum_DataPackage::Encrypt(bytes.data(), length);
   }
-  WriteOutput(options.output, bytes);
+  WriteOutput(options.output, bytes, options.input);
 }
 
 void Show(const ShowOptions& options) {
-  const std::string name = StreamName(options.file, true);
-  std::string text = ReadInput(options.file);
-  if (options.scrambled) {
-    CheckScramblable(text, name);
-    Lum_DataPackage::Decrypt(text.data(), static_cast<int>(text.size()));
-  }
-  text.resize(std::min(text.size(), text.find('\0')));  // the reader stops at a NUL
-  const Plugins plugins = LoadPlugins();
-  ReadResult result;
-  try {
-    result = ReadPackage(plugins, text);
-  } catch (const StructureError& error) {
-    const bool hint = !options.scrambled && LooksScrambled(text);
-    throw InputError(At(name, text, error.offset()) + error.what() +
-                     (hint ? " (a scrambled package needs --scrambled)" : ""));
-  }
-  for (const Shortfall& shortfall : FindShortfalls(result)) {
-    std::fprintf(stderr, "datapack: %swarning: %s\n", At(name, text, shortfall.offset).c_str(),
+  const Plugins plugins = LoadPlugins(pluginDir);
+  Loaded loaded = Load(options.file, options.scrambling, plugins);
+  Places places(loaded.name, loaded.text);
+  for (const Shortfall& shortfall : FindShortfalls(loaded.result)) {
+    std::fprintf(stderr, "datapack: %swarning: %s\n", places.At(shortfall.offset).c_str(),
                  shortfall.message.c_str());
   }
-  WriteOutput("", options.json ? PackageToJson(result.package) : PackageOutline(result.package));
+  if (loaded.afterNul > 0) {
+    std::fprintf(stderr, "datapack: %swarning: %s after a NUL byte, where the reader stops\n",
+                 places.At(loaded.text.size()).c_str(),
+                 Counted(loaded.afterNul, "byte", "bytes").c_str());
+  }
+  loaded.text = std::string();  // the package is printed from what was read
+  Output out("");
+  if (options.json) {
+    WritePackageJson(loaded.result.package, out);
+  } else {
+    WriteOutline(loaded.result.package, out);
+  }
+  out.Commit();
 }
 
 void Pack(const PackOptions& options) {
@@ -82,30 +270,83 @@ void Pack(const PackOptions& options) {
   try {
     package = PackageFromJson(text);
   } catch (const JsonError& error) {
-    throw InputError(At(name, text, error.OffsetIn(text)) + error.what());
+    throw InputError(Places(name, text).At(error.OffsetIn(text)) + error.what());
   }
   if (options.crlf) package.crlf = true;
+  if (options.scramble) package.scrambled = true;
 
-  const auto refuse = [&](const std::vector<Problem>& problems) {
+  const auto refuse = [&](const std::vector<Problem>& problems, bool forceable) {
+    Places places(name, text);
     std::string message;
     for (const Problem& problem : problems) {
-      const std::size_t offset = JsonError(problem.pointer, "").OffsetIn(text);
-      message += At(name, text, offset) + problem.message + "\n";
+      message += places.At(JsonError(problem.pointer, "").OffsetIn(text)) + problem.message + "\n";
     }
-    throw InputError(message + "the package cannot carry this; --force writes it all the same");
+    throw InputError(message + (forceable ? "the package cannot carry this; --force writes it all "
+                                            "the same"
+                                          : "the package cannot carry this"));
   };
+  std::vector<Problem> problems = CheckLimits(package);
+  if (!options.force && !problems.empty()) refuse(problems, true);
+  std::erase_if(problems, [](const Problem& problem) { return problem.forceable; });
+  if (!problems.empty()) refuse(problems, false);
+
+  const Plugins plugins = LoadPlugins(pluginDir);
+  std::string bytes = WritePackage(plugins, package, false);
   if (!options.force) {
-    if (const std::vector<Problem> problems = CheckLimits(package); !problems.empty()) {
-      refuse(problems);
-    }
+    if (const auto problem = CheckReadBack(plugins, package, bytes)) refuse({*problem}, true);
   }
-  const Plugins plugins = LoadPlugins();
-  std::string package_bytes = WritePackage(plugins, package, false);
-  if (!options.force) {
-    if (const auto problem = CheckReadBack(plugins, package, package_bytes)) refuse({*problem});
+  if (package.scrambled) {
+    // The amount each byte is shifted by depends only on its place: the NUL the plug-in
+    // scrambles last changes nothing before it.
+    CheckScramblable(bytes, name);
+    Lum_DataPackage::Encrypt(bytes.data(), static_cast<int>(bytes.size()));
   }
-  if (options.scramble) package_bytes = WritePackage(plugins, package, true);
-  WriteOutput(options.output, package_bytes);
+  WriteOutput(options.output, bytes, options.file);
+}
+
+int Check(const CheckOptions& options) {
+  const Plugins plugins = LoadPlugins(pluginDir);
+  const std::string name = StreamName(options.file, true);
+  Loaded loaded;
+  try {
+    loaded = Load(options.file, options.scrambling, plugins);
+  } catch (const InputError& error) {
+    // Not a package at all: the one finding.
+    if (std::string_view(error.what()).starts_with("cannot read")) throw;
+    Output out("");
+    out << error.what() << "\n";
+    out.Commit();
+    return 1;
+  }
+  Places places(loaded.name, loaded.text);
+  Output out("");
+  bool failed = false;
+  for (const Finding& finding : Findings(loaded, plugins)) {
+    failed = failed || !finding.warning || options.strict;
+    out << places.At(finding.offset) << (finding.warning ? "warning: " : "error: ")
+        << finding.message << "\n";
+  }
+  out.Commit();
+  return failed ? 1 : 0;
+}
+
+int Diff(const DiffOptions& options) {
+  const Plugins plugins = LoadPlugins(pluginDir);
+  Loaded before = Load(options.before, options.scrambling, plugins);
+  before.text = std::string();
+  Loaded after = Load(options.after, options.scrambling, plugins);
+  after.text = std::string();
+  const Package& a = before.result.package;
+  const Package& b = after.result.package;
+  Output out("");
+  Differ differ(out);
+  if (a.header != b.header) differ.Report("header", ValueText(a.header), ValueText(b.header));
+  if (a.crlf != b.crlf) {
+    differ.Report("line breaks", a.crlf ? "CRLF" : "LF", b.crlf ? "CRLF" : "LF");
+  }
+  differ.Directory(a.top, a.entries, b.top, b.entries, "");
+  out.Commit();
+  return differ.different ? 1 : 0;
 }
 
 }  // namespace datapack

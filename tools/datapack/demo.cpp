@@ -93,7 +93,7 @@ void PrintBytes(const std::vector<char>& bytes, std::size_t count) {
 
 }  // namespace
 
-void RunDemo(const Plugins& plugins) {
+std::string RunDemo(const Plugins& plugins) {
   const ChannelLibrary& directories = *plugins.directories;
   const ChannelLibrary& texts = *plugins.texts;
   const ChannelType& type = directories.Type();
@@ -109,6 +109,7 @@ void RunDemo(const Plugins& plugins) {
   writer.Directory().WriteToBuffer(package.data(), size, true, false);
   std::printf("Package     %d bytes with its NUL, LF line breaks, empty header:\n", size);
   PrintText(package.data());
+  std::string plain(package.data());
 
   writer.Directory().WriteToBuffer(package.data(), size, true, true);
   std::printf("\nScrambled   the same %d bytes, the first 24:\n", size);
@@ -125,6 +126,7 @@ void RunDemo(const Plugins& plugins) {
     std::printf("  %-6zu %-8s %g\n", i, received[i].name.c_str(),
                 static_cast<double>(received[i].score));
   }
+  return plain;
 }
 
 }  // namespace datapack

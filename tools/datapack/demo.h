@@ -2,10 +2,13 @@
 // into a second tree.
 #pragma once
 
+#include <string>
+
 #include "tools/datapack/plugins.h"
 
 namespace datapack {
 
-void RunDemo(const Plugins& plugins);
+// Returns the package it wrote, without its NUL.
+std::string RunDemo(const Plugins& plugins);
 
 }  // namespace datapack

@@ -19,10 +19,10 @@ bool Contains(std::string_view text, std::string_view part) {
 
 std::string Length(std::string_view text) { return std::to_string(text.size()) + " characters, "; }
 
+constexpr std::string_view kNulProblem = "holds a NUL character, which ends it there";
+
 std::optional<std::string> CommonProblem(std::string_view text) {
-  if (Contains(text, std::string_view("\0", 1))) {
-    return "holds a NUL character, which ends it there";
-  }
+  if (Contains(text, std::string_view("\0", 1))) return std::string(kNulProblem);
   if (!text.empty() && (IsSpace(text.front()) || IsSpace(text.back()))) {
     return "begins or ends with whitespace, which the reader trims";
   }
@@ -30,7 +30,7 @@ std::optional<std::string> CommonProblem(std::string_view text) {
 }
 
 // Directory and data channel names alike; only what a long one suffers differs.
-std::optional<std::string> NameProblem(std::string_view name, const char* whenLong) {
+std::optional<std::string> AnyNameProblem(std::string_view name, const char* whenLong) {
   if (name.empty()) return "an empty name, which the reader cannot look for";
   // "<" and the name would make "</", which the reader takes for a closing tag.
   if (name.starts_with('/')) return "begins with \"/\", so that its tag reads as a closing tag";
@@ -42,23 +42,12 @@ std::optional<std::string> NameProblem(std::string_view name, const char* whenLo
   return std::nullopt;
 }
 
-std::optional<std::string> TextProblem(std::string_view text) {
-  if (auto problem = CommonProblem(text)) return problem;
-  if (Contains(text, "</")) return "holds \"</\", where the reader ends the text";
-  if (text.size() > kLongest) {
-    return Length(text) + "but the reader takes one longer than 2047 as the empty text";
-  }
-  return std::nullopt;
-}
-
 // The reader looks for the directory's first tag from the start of the package, header included.
 std::optional<std::string> HeaderProblem(std::string_view header, std::string_view top) {
   if (header.size() > kLongest) {
     return Length(header) + "but the writer leaves out a header longer than 2047";
   }
-  if (Contains(header, std::string_view("\0", 1))) {
-    return "holds a NUL character, which ends it there";
-  }
+  if (Contains(header, std::string_view("\0", 1))) return std::string(kNulProblem);
   for (std::size_t open = header.find('<'); open != std::string_view::npos;
        open = header.find('<', open + 1)) {
     const std::size_t close = header.find('>', open);
@@ -104,25 +93,22 @@ class Checker {
   std::vector<Problem> problems;
 
   void Report(const Place& place, const std::optional<std::string>& problem) {
-    if (problem) problems.push_back({place.pointer, place.path + ": " + *problem});
+    // A NUL ends the channel's text: nothing could write what follows it.
+    if (problem) {
+      problems.push_back({place.pointer, place.path + ": " + *problem, *problem != kNulProblem});
+    }
   }
 
   void CheckShape(const Shape& shape, const Place& place, int depth) {
     const Place named = place.Named(shape.name);
-    std::optional<std::string> problem =
-        NameProblem(shape.name, "but the package keeps only the first 2047 of a name");
-    if (!problem && Contains(shape.name, "</")) {
-      problem = "holds \"</\", where the reader looks for the directory's closing tag";
-    }
-    Report(named.Key(kNameKey), problem);
+    Report(named.Key(kNameKey), NameProblem(shape.name, true));
     if (depth >= Lum_DataPackage::kMaxNesting) {
       Report(named, std::string("nested deeper than 1023 directories, which the walk skips"));
       return;
     }
     for (std::size_t j = 0; j < shape.data.size(); ++j) {
       const Place slot = named.Key(kDataKey).Item(j).Named(shape.data[j].name);
-      Report(slot.Key(kNameKey),
-             NameProblem(shape.data[j].name, "but a longer name than 2047 is never read back"));
+      Report(slot.Key(kNameKey), NameProblem(shape.data[j].name, false));
     }
     for (std::size_t k = 0; k < shape.directories.size(); ++k)
       CheckShape(shape.directories[k], named.Key(kDirectoriesKey).Item(k), depth + 1);
@@ -130,8 +116,7 @@ class Checker {
 
   void CheckEntries(const Shape& shape, const std::vector<Entry>& entries, const Place& list) {
     if (entries.size() > static_cast<std::size_t>(Lum_DataPackage::kMaxReadEntries)) {
-      Report(list, std::to_string(entries.size()) +
-                       " entries, but the reader takes at most 9999 from a directory");
+      Report(list, EntryCountProblem(entries.size()));
     } else if (entries.size() > 1) {
       // The reader takes a whole tag, name and id, into a field of 2047 characters.
       const std::string lastId = " id=\"" + std::to_string(entries.size() - 1) + "\"";
@@ -164,6 +149,30 @@ class Checker {
 };
 
 }  // namespace
+
+std::optional<std::string> NameProblem(std::string_view name, bool directory) {
+  if (!directory) return AnyNameProblem(name, "but a longer name than 2047 is never read back");
+  if (auto problem = AnyNameProblem(name, "but the package keeps only the first 2047 of a name")) {
+    return problem;
+  }
+  if (Contains(name, "</")) {
+    return "holds \"</\", where the reader looks for the directory's closing tag";
+  }
+  return std::nullopt;
+}
+
+std::optional<std::string> TextProblem(std::string_view text) {
+  if (auto problem = CommonProblem(text)) return problem;
+  if (Contains(text, "</")) return "holds \"</\", where the reader ends the text";
+  if (text.size() > kLongest) {
+    return Length(text) + "but the reader takes one longer than 2047 as the empty text";
+  }
+  return std::nullopt;
+}
+
+std::string EntryCountProblem(std::size_t count) {
+  return std::to_string(count) + " entries, but the reader takes at most 9999 from a directory";
+}
 
 std::vector<Problem> CheckLimits(const Package& package) {
   Checker checker;

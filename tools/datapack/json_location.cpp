@@ -120,8 +120,8 @@ std::size_t LocateJsonPointer(std::string_view text, std::string_view pointer) {
   return found;
 }
 
-std::size_t FindOverflowingNumber(std::string_view text) {
-  for (std::size_t at = 0; at < text.size(); ++at) {
+std::size_t FindOverflowingNumber(std::string_view text, std::size_t from) {
+  for (std::size_t at = from; at < text.size(); ++at) {
     if (text[at] == '"') {
       for (++at; at < text.size() && text[at] != '"'; ++at) {
         if (text[at] == '\\') ++at;
@@ -134,7 +134,7 @@ std::size_t FindOverflowingNumber(std::string_view text) {
       at += number.size() - 1;
     }
   }
-  return 0;
+  return std::string_view::npos;
 }
 
 }  // namespace datapack

@@ -10,7 +10,8 @@ namespace datapack {
 // value on its way there when the text has no such value.
 std::size_t LocateJsonPointer(std::string_view text, std::string_view pointer);
 
-// The byte offset of the first number in the text too large for a float; 0 when there is none.
-std::size_t FindOverflowingNumber(std::string_view text);
+// The byte offset of the first number from `from` on too large for a float; npos when there is
+// none.
+std::size_t FindOverflowingNumber(std::string_view text, std::size_t from);
 
 }  // namespace datapack

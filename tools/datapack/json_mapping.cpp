@@ -2,9 +2,11 @@
 
 #include <algorithm>
 #include <cmath>
+#include <functional>
 #include <limits>
 #include <nlohmann/json.hpp>
 
+#include "plugin/data_package.h"
 #include "tools/datapack/json_location.h"
 #include "tools/datapack/text_encoding.h"
 
@@ -22,61 +24,101 @@ constexpr std::string_view kTypeKey = "type";
 constexpr std::string_view kLatin1 = "Latin-1";
 constexpr std::string_view kUtf8 = "UTF-8";
 constexpr int kMatrixRows = 4;
+// Stands for a number too large for a float while the JSON is read.
+constexpr std::string_view kOverflow = "\x01 beyond a float";
+constexpr std::string_view kOverflowJson = "\"\\u0001 beyond a float\"";
 
 // ---- Writing JSON -------------------------------------------------------------------------------
+
+// A value of the JSON form, made only when the printer comes to it: the form of a large package is
+// never held whole, and no part of it is made more than a few times.
+struct View {
+  enum class Type { kScalar, kArray, kObject };
+  Type type = Type::kScalar;
+  std::string scalar;                      // the JSON text of a scalar
+  std::vector<std::string_view> keys;      // an object's, in order
+  std::size_t size = 0;                    // an array's items or an object's members
+  std::function<View(std::size_t)> child;  // the item or member at an index
+};
+
+View Scalar(std::string json) { return {View::Type::kScalar, std::move(json), {}, 0, {}}; }
+
+View Array(std::size_t size, std::function<View(std::size_t)> child) {
+  return {View::Type::kArray, {}, {}, size, std::move(child)};
+}
+
+View Object(std::vector<std::string_view> keys, std::function<View(std::size_t)> child) {
+  const std::size_t size = keys.size();
+  return {View::Type::kObject, {}, std::move(keys), size, std::move(child)};
+}
 
 class ToJson {
  public:
   explicit ToJson(bool latin1) : latin1_(latin1) {}
 
-  Json Text(const std::string& bytes) const { return latin1_ ? Latin1ToUtf8(bytes) : bytes; }
-
-  static Json Number(float number) {
-    if (std::isfinite(number)) return number;
-    if (std::isinf(number)) return number < 0 ? "-inf" : "inf";
-    return std::signbit(number) ? "-nan" : "nan";
+  View Text(const std::string& bytes) const {
+    return Scalar(Json(latin1_ ? Latin1ToUtf8(bytes) : bytes).dump());
   }
 
-  Json Shape(const datapack::Shape& shape) const {
-    Json data = Json::array();
-    for (const DataSlot& slot : shape.data) {
-      data.push_back({{kNameKey, Text(slot.name)}, {kTypeKey, std::string(KindName(slot.kind))}});
-    }
-    Json directories = Json::array();
-    for (const datapack::Shape& sub : shape.directories)
-      directories.push_back(Shape(sub));
-    return {{kNameKey, Text(shape.name)}, {kDataKey, data}, {kDirectoriesKey, directories}};
+  static View Number(float number) {
+    if (std::isfinite(number)) return Scalar(Json(number).dump());
+    if (std::isinf(number)) return Scalar(number < 0 ? "\"-inf\"" : "\"inf\"");
+    return Scalar(std::signbit(number) ? "\"-nan\"" : "\"nan\"");
   }
 
-  Json Entries(const datapack::Shape& shape, const std::vector<Entry>& entries) const {
-    Json list = Json::array();
-    for (const Entry& entry : entries) {
-      Json item = Json::object();
-      if (!shape.data.empty()) {
-        Json& values = item[kValuesKey] = Json::array();
-        for (const datapack::Value& value : entry.values)
-          values.push_back(Value(value));
+  static View Numbers(const float* numbers, std::size_t count) {
+    return Array(count, [numbers](std::size_t i) { return Number(numbers[i]); });
+  }
+
+  View Shape(const datapack::Shape& shape, const std::vector<Entry>* entries) const {
+    std::vector<std::string_view> keys = {kNameKey, kDataKey, kDirectoriesKey};
+    if (entries) keys.push_back(kEntriesKey);
+    return Object(std::move(keys), [this, &shape, entries](std::size_t i) {
+      switch (i) {
+        case 0:
+          return Text(shape.name);
+        case 1:
+          return Array(shape.data.size(), [this, &shape](std::size_t j) {
+            const DataSlot& slot = shape.data[j];
+            return Object({kNameKey, kTypeKey}, [this, &slot](std::size_t k) {
+              return k == 0 ? Text(slot.name)
+                            : Scalar(Json(std::string(KindName(slot.kind))).dump());
+            });
+          });
+        case 2:
+          return Array(shape.directories.size(), [this, &shape](std::size_t k) {
+            return Shape(shape.directories[k], nullptr);
+          });
       }
-      if (!shape.directories.empty()) {
-        Json& directories = item[kDirectoriesKey] = Json::array();
-        for (std::size_t k = 0; k < shape.directories.size(); ++k)
-          directories.push_back(Entries(shape.directories[k], entry.directories[k]));
-      }
-      list.push_back(std::move(item));
-    }
-    return list;
+      return Entries(shape, *entries);
+    });
   }
 
-  Json Value(const datapack::Value& value) const {
+  View Entries(const datapack::Shape& shape, const std::vector<Entry>& entries) const {
+    return Array(entries.size(), [this, &shape, &entries](std::size_t i) {
+      const Entry& entry = entries[i];
+      std::vector<std::string_view> keys;
+      if (!shape.data.empty()) keys.push_back(kValuesKey);
+      if (!shape.directories.empty()) keys.push_back(kDirectoriesKey);
+      return Object(std::move(keys), [this, &shape, &entry](std::size_t k) {
+        if (k == 0 && !shape.data.empty()) {
+          return Array(entry.values.size(),
+                       [this, &entry](std::size_t j) { return Value(entry.values[j]); });
+        }
+        return Array(shape.directories.size(), [this, &shape, &entry](std::size_t j) {
+          return Entries(shape.directories[j], entry.directories[j]);
+        });
+      });
+    });
+  }
+
+  View Value(const datapack::Value& value) const {
     if (const auto* text = std::get_if<std::string>(&value)) return Text(*text);
     if (const auto* number = std::get_if<float>(&value)) return Number(*number);
-    if (const auto* vector = std::get_if<D3DXVECTOR3>(&value))
-      return {Number(vector->x), Number(vector->y), Number(vector->z)};
+    if (const auto* vector = std::get_if<D3DXVECTOR3>(&value)) return Numbers(&vector->x, 3);
     const auto& matrix = std::get<D3DXMATRIX>(value);
-    Json rows = Json::array();
-    for (const auto& row : matrix.m)
-      rows.push_back({Number(row[0]), Number(row[1]), Number(row[2]), Number(row[3])});
-    return rows;
+    return Array(kMatrixRows,
+                 [&matrix](std::size_t r) { return Numbers(matrix.m[r], kMatrixRows); });
   }
 
  private:
@@ -108,46 +150,64 @@ bool AllUtf8(const std::vector<Entry>& entries) {
 }
 
 // Containers that fit the width stand on one line, and so do lists of plain values.
-std::string Compact(const Json& json) {
-  if (json.is_array()) {
-    std::string out = "[";
-    for (std::size_t i = 0; i < json.size(); ++i)
-      out += (i ? ", " : "") + Compact(json[i]);
-    return out + "]";
-  }
-  if (json.is_object()) {
-    std::string out = "{";
-    for (auto it = json.begin(); it != json.end(); ++it)
-      out += (it == json.begin() ? "" : ", ") + Json(it.key()).dump() + ": " + Compact(*it);
-    return out + "}";
-  }
-  return json.dump();
-}
+class Printer {
+ public:
+  explicit Printer(Output& out) : out_(out) {}
 
-bool HoldsContainers(const Json& json) {
-  for (const Json& item : json) {
-    if (item.is_structured()) return true;
+  void Print(const View& view, std::size_t indent) {
+    constexpr std::size_t kWidth = 100;
+    const bool fits = indent <= kWidth && CompactSize(view, kWidth - indent) <= kWidth - indent;
+    if (view.type == View::Type::kScalar || fits || !HoldsContainers(view)) {
+      Compact(view);
+      return;
+    }
+    const std::string inner(indent + 2, ' ');
+    out_ << (view.type == View::Type::kArray ? "[\n" : "{\n");
+    for (std::size_t i = 0; i < view.size; ++i) {
+      out_ << inner;
+      if (view.type == View::Type::kObject) out_ << "\"" << view.keys[i] << "\": ";
+      Print(view.child(i), inner.size());
+      out_ << (i + 1 == view.size ? "\n" : ",\n");
+    }
+    out_ << std::string(indent, ' ') << (view.type == View::Type::kArray ? "]" : "}");
   }
-  return false;
-}
 
-void Print(const Json& json, std::size_t indent, std::string& out) {
-  constexpr std::size_t kWidth = 100;
-  const std::string compact = Compact(json);
-  if (!json.is_structured() || indent + compact.size() <= kWidth || !HoldsContainers(json)) {
-    out += compact;
-    return;
+ private:
+  // The length of the compact form, counted no further than just past `limit`.
+  static std::size_t CompactSize(const View& view, std::size_t limit) {
+    if (view.type == View::Type::kScalar) return view.scalar.size();
+    std::size_t size = 2;
+    for (std::size_t i = 0; i < view.size && size <= limit; ++i) {
+      if (i) size += 2;
+      if (view.type == View::Type::kObject) size += view.keys[i].size() + 4;
+      if (size <= limit) size += CompactSize(view.child(i), limit - size);
+    }
+    return size;
   }
-  const std::string inner(indent + 2, ' ');
-  out += json.is_array() ? "[\n" : "{\n";
-  for (auto it = json.begin(); it != json.end(); ++it) {
-    out += inner;
-    if (json.is_object()) out += Json(it.key()).dump() + ": ";
-    Print(*it, inner.size(), out);
-    out += std::next(it) == json.end() ? "\n" : ",\n";
+
+  static bool HoldsContainers(const View& view) {
+    for (std::size_t i = 0; i < view.size; ++i) {
+      if (view.child(i).type != View::Type::kScalar) return true;
+    }
+    return false;
   }
-  out += std::string(indent, ' ') + (json.is_array() ? "]" : "}");
-}
+
+  void Compact(const View& view) {
+    if (view.type == View::Type::kScalar) {
+      out_ << view.scalar;
+      return;
+    }
+    out_ << (view.type == View::Type::kArray ? "[" : "{");
+    for (std::size_t i = 0; i < view.size; ++i) {
+      if (i) out_ << ", ";
+      if (view.type == View::Type::kObject) out_ << "\"" << view.keys[i] << "\": ";
+      Compact(view.child(i));
+    }
+    out_ << (view.type == View::Type::kArray ? "]" : "}");
+  }
+
+  Output& out_;
+};
 
 // ---- Reading JSON -------------------------------------------------------------------------------
 
@@ -156,7 +216,7 @@ class FromJson {
   Package Read(const Json& root) {
     const Place place{"", ""};
     Expect(root, place, Json::value_t::object, "an object");
-    Keys(root, place, {kHeaderKey, kLineBreaksKey, kEncodingKey, kDirectoryKey});
+    Keys(root, place, {kHeaderKey, kLineBreaksKey, kEncodingKey, kScrambledKey, kDirectoryKey});
     if (const Json* encoding = Find(root, place, kEncodingKey)) {
       const std::string name = String(*encoding, place.Key(kEncodingKey));
       if (name != kUtf8 && name != kLatin1) {
@@ -175,10 +235,14 @@ class FromJson {
       }
       package.crlf = name == "CRLF";
     }
+    if (const Json* scrambled = Find(root, place, kScrambledKey)) {
+      Expect(*scrambled, place.Key(kScrambledKey), Json::value_t::boolean, "true or false");
+      package.scrambled = scrambled->get<bool>();
+    }
     const Json* directory = Find(root, place, kDirectoryKey);
     if (!directory) Fail(place, "no \"directory\"");
     const Place top = place.Key(kDirectoryKey);
-    package.top = Shape(*directory, top, true);
+    package.top = Shape(*directory, top, 0);
     if (const Json* entries = Find(*directory, top, kEntriesKey)) {
       package.entries =
           Entries(package.top, *entries, top.Named(package.top.name).Key(kEntriesKey));
@@ -242,6 +306,7 @@ class FromJson {
     if (json.is_number()) return json.get<float>();
     if (json.is_string()) {
       const std::string name = json.get<std::string>();
+      if (name == kOverflow) Fail(place, "a number beyond the range of a float");
       const bool negative = name.starts_with('-');
       const std::string_view word = std::string_view(name).substr(negative ? 1 : 0);
       float number = 0.0f;
@@ -253,7 +318,12 @@ class FromJson {
     Fail(place, "expected a number, \"inf\", \"-inf\", \"nan\" or \"-nan\"");
   }
 
-  datapack::Shape Shape(const Json& json, const Place& place, bool top) {
+  datapack::Shape Shape(const Json& json, const Place& place, int depth) {
+    const bool top = depth == 0;
+    if (depth >= Lum_DataPackage::kMaxNesting) {
+      // Refused at once: going on would cost time and memory with the square of the depth.
+      Fail(place, "nested deeper than 1023 directories, which the walk skips");
+    }
     datapack::Shape shape;
     const Json* name = Find(json, place, kNameKey);
     if (!name) Fail(place, "a directory without a \"name\"");
@@ -279,7 +349,7 @@ class FromJson {
     if (const Json* directories = Find(json, place, kDirectoriesKey)) {
       const Place list = named.Key(kDirectoriesKey);
       for (std::size_t k = 0; k < Array(*directories, list).size(); ++k)
-        shape.directories.push_back(Shape((*directories)[k], list.Item(k), false));
+        shape.directories.push_back(Shape((*directories)[k], list.Item(k), depth + 1));
     }
     return shape;
   }
@@ -339,22 +409,46 @@ class FromJson {
 
 }  // namespace
 
+std::string ShownName(std::string_view name) {
+  constexpr std::size_t kShown = 40;
+  std::string shown;
+  for (char c : name.substr(0, kShown)) {
+    const auto byte = static_cast<unsigned char>(c);
+    if (byte < 0x20 || byte == 0x7F) {
+      constexpr char kDigits[] = "0123456789abcdef";
+      shown += {'\\', 'x', kDigits[byte >> 4], kDigits[byte & 15]};
+    } else {
+      shown += c;
+    }
+  }
+  if (name.size() > kShown) shown += "...";
+  return shown;
+}
+
 std::size_t JsonError::OffsetIn(std::string_view text) const {
   return offset_ ? *offset_ : LocateJsonPointer(text, pointer_);
 }
 
-std::string PackageToJson(const Package& package) {
+void WritePackageJson(const Package& package, Output& out) {
   const bool latin1 = !IsUtf8(package.header) || !AllUtf8(package.top) || !AllUtf8(package.entries);
   const ToJson to(latin1);
-  Json directory = to.Shape(package.top);
-  directory[kEntriesKey] = to.Entries(package.top, package.entries);
-  const Json root = {{kHeaderKey, to.Text(package.header)},
-                     {kLineBreaksKey, package.crlf ? "CRLF" : "LF"},
-                     {kEncodingKey, latin1 ? kLatin1 : kUtf8},
-                     {kDirectoryKey, std::move(directory)}};
-  std::string out;
-  Print(root, 0, out);
-  return out + "\n";
+  std::vector<std::string_view> keys = {kHeaderKey, kLineBreaksKey, kEncodingKey};
+  if (package.scrambled) keys.push_back(kScrambledKey);
+  keys.push_back(kDirectoryKey);
+  const View root = Object(keys, [&](std::size_t i) {
+    switch (i) {
+      case 0:
+        return to.Text(package.header);
+      case 1:
+        return Scalar(package.crlf ? "\"CRLF\"" : "\"LF\"");
+      case 2:
+        return Scalar(Json(std::string(latin1 ? kLatin1 : kUtf8)).dump());
+    }
+    if (i == 3 && package.scrambled) return Scalar("true");
+    return to.Shape(package.top, &package.entries);
+  });
+  Printer(out).Print(root, 0);
+  out << "\n";
 }
 
 Package PackageFromJson(std::string_view text) {
@@ -367,8 +461,19 @@ Package PackageFromJson(std::string_view text) {
     throw JsonError(error.byte ? error.byte - 1 : 0,
                     detail == std::string::npos ? what : what.substr(detail + 2));
   } catch (const Json::out_of_range&) {
-    // The parser says which number but not where: the first one beyond a float's range.
-    throw JsonError(FindOverflowingNumber(text), "a number beyond the range of a float");
+    // The parser says which number but neither where nor whose: mark each number beyond a float's
+    // range, so that reading names the first one's path.
+    std::string marked(text);
+    for (std::size_t at = FindOverflowingNumber(marked, 0); at != std::string::npos;
+         at = FindOverflowingNumber(marked, at)) {
+      const std::size_t end = marked.find_first_not_of("+-.0123456789eE", at);
+      marked.replace(at, end - at, kOverflowJson);
+    }
+    try {
+      root = Json::parse(marked);
+    } catch (const Json::exception&) {
+      throw JsonError(FindOverflowingNumber(text, 0), "a number beyond the range of a float");
+    }
   }
   return FromJson().Read(root);
 }

@@ -17,9 +17,13 @@
 #include <string>
 #include <string_view>
 
+#include "tools/datapack/file_io.h"
 #include "tools/datapack/package_model.h"
 
 namespace datapack {
+
+// A name as messages show it: its first 40 bytes, control bytes as \xNN.
+std::string ShownName(std::string_view name);
 
 // Where a part of a package stands in its JSON form, and how a message names it.
 struct Place {
@@ -32,11 +36,9 @@ struct Place {
   Place Entry(std::size_t index) const {
     return {pointer + "/" + std::to_string(index), path + "[" + std::to_string(index) + "]"};
   }
-  // Long names are cut short in messages.
+  // Long names are cut short in messages, and bytes a terminal would not show are escaped.
   Place Named(std::string_view name) const {
-    constexpr std::size_t kShown = 40;
-    std::string shown(name.substr(0, kShown));
-    if (name.size() > kShown) shown += "...";
+    const std::string shown = ShownName(name);
     return {pointer, path.empty() ? shown : path + "." + shown};
   }
 };
@@ -48,6 +50,7 @@ inline constexpr std::string_view kDataKey = "data";
 inline constexpr std::string_view kDirectoriesKey = "directories";
 inline constexpr std::string_view kEntriesKey = "entries";
 inline constexpr std::string_view kValuesKey = "values";
+inline constexpr std::string_view kScrambledKey = "scrambled";
 
 // A JSON text that does not describe a package. Either `offset` or a JSON pointer says where.
 class JsonError : public std::runtime_error {
@@ -65,7 +68,8 @@ class JsonError : public std::runtime_error {
   std::optional<std::size_t> offset_;
 };
 
-std::string PackageToJson(const Package& package);
+// Prints the JSON form piece by piece.
+void WritePackageJson(const Package& package, Output& out);
 
 // Throws JsonError.
 Package PackageFromJson(std::string_view text);

@@ -6,6 +6,7 @@
 #include "tools/datapack/text_encoding.h"
 
 namespace datapack {
+
 namespace {
 
 // C escapes for what a terminal would not show as it is; bytes of texts that are not UTF-8 as
@@ -59,6 +60,8 @@ std::string Numbers(const float* numbers, int count) {
   return out;
 }
 
+}  // namespace
+
 std::string ValueText(const Value& value) {
   if (const auto* text = std::get_if<std::string>(&value)) return Quoted(*text);
   if (const float* number = std::get_if<float>(&value)) return Number(*number);
@@ -66,17 +69,18 @@ std::string ValueText(const Value& value) {
   return Numbers(&std::get<D3DXMATRIX>(value).m[0][0], 16);
 }
 
+namespace {
+
 void Directory(const Shape& shape, const std::vector<Entry>& entries, const std::string& indent,
-               std::string& out) {
-  out += indent + Escaped(shape.name) + ": " + std::to_string(entries.size()) +
-         (entries.size() == 1 ? " entry\n" : " entries\n");
+               Output& out) {
+  out << indent << Escaped(shape.name) << ": " << Counted(entries.size(), "entry", "entries")
+      << "\n";
   const std::string inner = indent + "    ";
   for (std::size_t i = 0; i < entries.size(); ++i) {
-    out += indent + "  entry " + std::to_string(i) + "\n";
+    out << indent << "  entry " << std::to_string(i) << "\n";
     for (std::size_t j = 0; j < shape.data.size(); ++j) {
-      out += inner + Escaped(shape.data[j].name) + " (" +
-             std::string(KindName(shape.data[j].kind)) + "): " + ValueText(entries[i].values[j]) +
-             "\n";
+      out << inner << Escaped(shape.data[j].name) << " (" << KindName(shape.data[j].kind)
+          << "): " << ValueText(entries[i].values[j]) << "\n";
     }
     for (std::size_t k = 0; k < shape.directories.size(); ++k)
       Directory(shape.directories[k], entries[i].directories[k], inner, out);
@@ -85,11 +89,15 @@ void Directory(const Shape& shape, const std::vector<Entry>& entries, const std:
 
 }  // namespace
 
-std::string PackageOutline(const Package& package) {
-  std::string out = "header: " + Quoted(package.header) + "\n";
-  out += std::string("line breaks: ") + (package.crlf ? "CRLF" : "LF") + "\n";
+std::string Counted(std::size_t count, std::string_view one, std::string_view many) {
+  return std::to_string(count) + " " + std::string(count == 1 ? one : many);
+}
+
+void WriteOutline(const Package& package, Output& out) {
+  out << "header: " << Quoted(package.header) << "\n";
+  out << "line breaks: " << (package.crlf ? "CRLF" : "LF") << "\n";
+  if (package.scrambled) out << "scrambled\n";
   Directory(package.top, package.entries, "", out);
-  return out;
 }
 
 }  // namespace datapack

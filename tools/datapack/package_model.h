@@ -45,6 +45,7 @@ struct Entry {
 struct Package {
   std::string header;
   bool crlf = false;
+  bool scrambled = false;
   Shape top;
   std::vector<Entry> entries;
 };

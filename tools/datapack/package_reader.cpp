@@ -4,6 +4,7 @@
 
 #include "tools/datapack/channel_tree.h"
 #include "tools/datapack/json_mapping.h"
+#include "tools/datapack/outline.h"
 
 namespace datapack {
 namespace {
@@ -12,9 +13,9 @@ void FindShortfalls(const FoundDirectory& found, const Shape& shape,
                     const std::vector<Entry>& entries, const Place& place,
                     std::vector<Shortfall>& out) {
   if (found.entries.size() != entries.size()) {
-    out.push_back({found.offset, "the text holds " + std::to_string(found.entries.size()) +
-                                     " entries of " + place.path + ", the reader takes " +
-                                     std::to_string(entries.size())});
+    out.push_back({found.offset,
+                   "the text holds " + Counted(found.entries.size(), "entry", "entries") + " of " +
+                       place.path + ", the reader takes " + std::to_string(entries.size())});
   }
   for (std::size_t i = 0; i < std::min(found.entries.size(), entries.size()); ++i) {
     for (std::size_t k = 0; k < shape.directories.size(); ++k) {
@@ -88,12 +89,13 @@ std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& 
 
 }  // namespace
 
-ReadResult ReadPackage(const Plugins& plugins, std::string_view text) {
+ReadResult ReadPackage(const Plugins& plugins, std::string& text) {
   Structure structure = FindStructure(text);
   ReadResult result;
   result.package.entries = ChannelTree(plugins, structure.top).Read(text, structure.crlf);
   result.package.header = std::move(structure.header);
   result.package.crlf = structure.crlf;
+  result.notes = std::move(structure.notes);
   result.package.top = std::move(structure.top);
   result.found = std::move(structure.found);
   return result;
@@ -110,8 +112,9 @@ std::optional<Problem> CheckReadBack(const Plugins& plugins, const Package& pack
                                      const std::string& written) {
   const Place top = Place{"", ""}.Key(kDirectoryKey).Named(package.top.name);
   ReadResult back;
+  std::string text = written;
   try {
-    back = ReadPackage(plugins, written);
+    back = ReadPackage(plugins, text);
   } catch (const StructureError& error) {
     return Problem{top.pointer,
                    "the package written from it does not read back: " + std::string(error.what())};

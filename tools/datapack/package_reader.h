@@ -17,10 +17,11 @@ namespace datapack {
 struct ReadResult {
   Package package;
   FoundDirectory found;  // the entries the text holds, read or not
+  std::vector<Note> notes;
 };
 
 // Throws StructureError when the text does not hold a package.
-ReadResult ReadPackage(const Plugins& plugins, std::string_view text);
+ReadResult ReadPackage(const Plugins& plugins, std::string& text);
 
 // Where the text holds another number of entries than the reader took.
 struct Shortfall {

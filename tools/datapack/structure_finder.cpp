@@ -1,6 +1,11 @@
 #include "tools/datapack/structure_finder.h"
 
+#include <cstdlib>
 #include <optional>
+
+#include "plugin/data_package.h"
+#include "tools/datapack/format_limits.h"
+#include "tools/datapack/json_mapping.h"
 
 namespace datapack {
 namespace {
@@ -31,6 +36,7 @@ struct Tag {
   std::string_view name;
   std::optional<Kind> kind;  // set on the opening tag of a data element
   bool hasId = false;
+  std::size_t id = 0;
 };
 
 // One directory of the tree as far as the text has shown it.
@@ -68,9 +74,17 @@ class Parser {
     return ReadTag(at_);
   }
 
-  FoundDirectory Directory(Layout& layout) {
+  const std::vector<datapack::Note>& Notes() const { return notes_; }
+
+  FoundDirectory Directory(Layout& layout, int depth = 1) {
     const Tag open = Take();
     if (open.closing || open.kind) Fail(open, "expected a directory element");
+    if (depth > Lum_DataPackage::kMaxNesting) {
+      Fail(open.offset, "nested deeper than 1023 directories, which no writer packs");
+    }
+    const std::size_t pathLength = path_.size();
+    path_ += (path_.empty() ? "" : ".") + ShownName(open.name);
+    Notice(open.offset, false, NameProblem(open.name, true));
     if (!layout.named) {
       layout.name = std::string(open.name);
       layout.named = true;
@@ -82,19 +96,31 @@ class Parser {
       const std::optional<Tag> next = Peek();
       if (next && next->closing && next->name == open.name) {
         Take();  // an empty element: it tells nothing of what an entry holds
+        path_.resize(pathLength);
         return found;
       }
-      found.entries.push_back(Contents(layout));
+      found.entries.push_back(EntryContents(layout, 0, depth));
       Close(open.name);
+      path_.resize(pathLength);
       return found;
     }
-    for (;;) {
-      found.entries.push_back(Contents(layout));
+    for (Tag tag = open;;) {
+      const std::size_t index = found.entries.size();
+      if (tag.id != index) {
+        Notice(tag.offset, true,
+               "id " + std::to_string(tag.id) + " on entry " + std::to_string(index) +
+                   ": ids are not read, and the writer numbers entries from 0");
+      }
+      found.entries.push_back(EntryContents(layout, index, depth));
       Close(open.name);
       const std::optional<Tag> next = Peek();
       if (!next || next->closing || next->kind || !next->hasId || next->name != open.name) break;
-      Take();
+      tag = Take();
     }
+    if (found.entries.size() > static_cast<std::size_t>(Lum_DataPackage::kMaxReadEntries)) {
+      Notice(open.offset, false, EntryCountProblem(found.entries.size()));
+    }
+    path_.resize(pathLength);
     return found;
   }
 
@@ -140,6 +166,7 @@ class Parser {
         Fail(offset, "an entry id that is not a number: " + Quoted(tag.name));
       }
       tag.hasId = true;
+      tag.id = std::strtoull(number.data(), nullptr, 10);
       tag.name = Trim(tag.name.substr(0, id));
     }
     return tag;
@@ -160,16 +187,62 @@ class Parser {
     if (!tag.closing || tag.name != name) Fail(tag, "expected </" + std::string(name) + ">");
   }
 
+  void Notice(std::size_t offset, bool warning, const std::optional<std::string>& problem) {
+    if (problem) notes_.push_back({offset, warning, path_ + ": " + *problem});
+  }
+
   // A data element's value runs to the first "</", as the reader takes it.
   void SkipValue(const Tag& open) {
     const std::size_t close = text_.find("</", at_);
     if (close == npos) Fail(open, "a data element without its closing tag");
+    const std::string_view value = Trim(text_.substr(at_, close - at_));
+    const std::size_t pathLength = path_.size();
+    path_ += "." + ShownName(open.name);
+    Notice(open.offset, false, NameProblem(open.name, false));
+    if (*open.kind == Kind::kText) {
+      if (value.size() > Lum_DataPackage::kTextLength - 1)
+        Notice(open.offset, false, TextProblem(value));
+    } else {
+      Notice(open.offset, false, NumbersProblem(value, *open.kind));
+    }
+    path_.resize(pathLength);
     at_ = close;
     Close(open.name);
   }
 
+  // Numbers the reader takes otherwise than written: too few, or text it stops at.
+  static std::optional<std::string> NumbersProblem(std::string_view value, Kind kind) {
+    const std::size_t expected = kind == Kind::kValue ? 1 : kind == Kind::kVector ? 3 : 16;
+    std::size_t count = 0;
+    for (std::size_t at = 0; at < value.size();) {
+      const std::size_t end = std::min(value.find_first_of(" \t\r\n", at), value.size());
+      const std::string number(value.substr(at, end - at));
+      char* stop = nullptr;
+      std::strtof(number.c_str(), &stop);
+      if (stop != number.c_str() + number.size()) {
+        return "\"" + std::string(number.substr(0, 40)) + "\" does not scan whole as a number";
+      }
+      ++count;
+      at = value.find_first_not_of(" \t\r\n", end);
+      if (at == npos) break;
+    }
+    if (count != expected) {
+      return std::to_string(count) + (count == 1 ? " number" : " numbers") +
+             " where the reader takes " + std::to_string(expected);
+    }
+    return std::nullopt;
+  }
+
+  std::vector<FoundDirectory> EntryContents(Layout& layout, std::size_t index, int depth) {
+    const std::size_t pathLength = path_.size();
+    path_ += "[" + std::to_string(index) + "]";
+    std::vector<FoundDirectory> subs = Contents(layout, depth);
+    path_.resize(pathLength);
+    return subs;
+  }
+
   // One entry: its data elements, then its sub-directories. Returns the sub-directories found.
-  std::vector<FoundDirectory> Contents(Layout& layout) {
+  std::vector<FoundDirectory> Contents(Layout& layout, int depth) {
     const std::size_t start = at_;
     std::vector<DataSlot> data;
     for (std::optional<Tag> next = Peek(); next && next->kind; next = Peek()) {
@@ -191,7 +264,7 @@ class Parser {
         Fail(*next, "an entry of " + Quoted(layout.name) +
                         " holds more sub-directories than the entries before it");
       }
-      subs.push_back(Directory(layout.directories[subs.size()]));
+      subs.push_back(Directory(layout.directories[subs.size()], depth + 1));
     }
     if (layout.filled && subs.size() != layout.directories.size()) {
       Fail(at_, "an entry of " + Quoted(layout.name) +
@@ -203,6 +276,8 @@ class Parser {
 
   std::string_view text_;
   std::size_t at_;
+  std::string path_;
+  std::vector<datapack::Note> notes_;
 };
 
 }  // namespace
@@ -220,25 +295,40 @@ Structure FindStructure(std::string_view text) {
   const std::string_view name = Trim(text.substr(close + 2, end - 1 - (close + 2)));
   const bool crlf = close >= 2 && text.substr(close - 2, 2) == "\r\n";
 
-  // The directory starts at the first opening tag of that name from which the whole rest reads.
+  // The directory starts at the first opening tag of that name from which the whole rest reads. A
+  // header may hold such tags too, but not many: trying each of a great many would take time
+  // that grows with the square of the text.
+  constexpr int kAttempts = 16;
+  int attempts = 0;
   std::optional<StructureError> furthest;
-  for (std::size_t at = text.find('<'); at < close; at = text.find('<', at + 1)) {
+  std::optional<std::size_t> firstOpening;
+  for (std::size_t at = text.find('<'); at < close && attempts < kAttempts;
+       at = text.find('<', at + 1)) {
     Parser parser(text, at);
     try {
       const std::optional<Tag> tag = parser.Peek();
+      if (tag && !tag->closing && !firstOpening) firstOpening = at;
       if (!tag || tag->closing || tag->kind || tag->name != name) continue;
+      ++attempts;
       Layout layout;
       FoundDirectory found = parser.Directory(layout);
       if (!parser.AtEnd()) throw StructureError(parser.At(), "text after the directory's end");
       std::string_view header = text.substr(0, at);
       const std::string_view newline = crlf ? "\r\n" : "\n";
       if (header.ends_with(newline)) header.remove_suffix(newline.size());
-      return {std::string(header), crlf, layout.ToShape(), std::move(found)};
+      return {std::string(header), crlf, layout.ToShape(), std::move(found), parser.Notes()};
     } catch (const StructureError& error) {
       if (!furthest || error.offset() > furthest->offset()) furthest = error;
     }
   }
   if (furthest) throw *furthest;
+  // The last closing tag closes no directory: what the first opening tag starts says why, as a
+  // text cut short does.
+  if (firstOpening) {
+    Parser parser(text, *firstOpening);
+    Layout layout;
+    parser.Directory(layout);
+  }
   throw StructureError(close, "no opening tag for the closing tag </" + std::string(name) + ">");
 }
 

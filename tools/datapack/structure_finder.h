@@ -19,11 +19,19 @@ struct FoundDirectory {
   std::vector<std::vector<FoundDirectory>> entries;  // per entry, its sub-directories
 };
 
+// What the reader would take otherwise than the text holds it, noticed on the way.
+struct Note {
+  std::size_t offset;
+  bool warning;         // the engine gets the same values, but writing them again differs
+  std::string message;  // with the path of what it is about
+};
+
 struct Structure {
   std::string header;
   bool crlf = false;
   Shape top;
   FoundDirectory found;
+  std::vector<Note> notes;
 };
 
 class StructureError : public std::runtime_error {
