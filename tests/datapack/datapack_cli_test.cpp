@@ -292,3 +292,83 @@ TEST(DatapackCliTest, OutputFilesAreReplacedWholeOrNotAtAll) {
 }
 
 }  // namespace
+
+namespace {
+
+TEST(DatapackCliTest, CheckListsWhatTheReaderWouldChangeAndDiffComparesByPath) {
+  const std::string players = kPlayersPackage;
+  const auto replaced = [&](const std::string& from, const std::string& to) {
+    std::string text = players;
+    return text.replace(text.find(from), from.size(), to);
+  };
+  const struct {
+    std::string package;
+    int status;          // without --strict
+    int strictStatus;
+    const char* finding;  // expected in standard output
+  } checks[] = {
+      {players, 0, 0, ""},
+      {replaced("12.5", "12.5x"), 1, 1, "4:2: error: Players[0].Score: \"12.5x\" does not scan"},
+      {replaced("12.5", "1 2"), 1, 1, "4:2: error: Players[0].Score: 2 numbers where the reader"},
+      {replaced("Ann", std::string(2048, 'a')), 1, 1,
+       "3:2: error: Players[0].Name: 2048 characters, but the reader takes"},
+      {replaced("id=\"1\"", "id=\"7\""), 0, 1, "6:1: warning: Players: id 7 on entry 1: ids are not read"},
+      {replaced("</Name>\n", "</Name>\r\n"), 0, 1, "3:32: warning: mixed line breaks: CR LF in a package of LF"},
+      {players + std::string(1, '\0') + "tail", 1, 1, ":9:11: error: 4 bytes after a NUL byte, where the reader stops"},
+      {replaced("12.5", "12.50"), 0, 1, "warning: written again, the package differs"},
+      {"\n<P>\n\t<d>\n\t\t<v Type=\"Val\"> 1 </v>\n\t</d>\n\t<did id=\"0\">\n\t</did>"
+       "\n\t<did id=\"1\">\n\t</did>\n</P>",
+       1, 1, "3:2: error: the text holds 1 entry of P[0].d, the reader takes 2"},
+      {"hello", 1, 1, "standard input:1:5: no package"},
+  };
+  for (const auto& c : checks) {
+    const RunResult checked = RunDatapack({"check"}, c.package);
+    EXPECT_EQ(checked.status, c.status) << c.finding << "\n" << checked.out << checked.err;
+    EXPECT_NE(checked.out.find(c.finding), std::string::npos) << checked.out << checked.err;
+    EXPECT_EQ(RunDatapack({"check", "--strict", "-"}, c.package).status, c.strictStatus)
+        << c.finding;
+  }
+
+  // pack refuses what check finds in the package it would write.
+  const RunResult refused = RunDatapack(
+      {"pack"}, OneChannel("Txt", {"\"" + std::string(2048, 'a') + "\""}, "Players"));
+  EXPECT_NE(refused.err.find("4:15: Players[0].v: 2048 characters, but the reader takes"), std::string::npos)
+      << refused.err;
+
+  const fs::path folder = ScratchFolder();
+  const fs::path before = folder / "before.pkg";
+  const fs::path after = folder / "after.pkg";
+  WriteBytes(before, players);
+  const struct {
+    std::string after;
+    int status;
+    std::string out;
+  } diffs[] = {
+      {players, 0, ""},
+      {RunDatapack({"scramble"}, players).out, 0, ""},
+      {replaced("> 7 <", "> 8 <"), 1, "Players[1].Score: 7 \u2192 8\n"},
+      {replaced("Bob", "Bo"), 1, "Players[1].Name: \"Bob\" \u2192 \"Bo\"\n"},
+      {"\n<Players>\n\t<Name Type=\"Txt\"> Ann </Name>\n\t<Score Type=\"Val\"> 12.5 </Score>\n"
+       "</Players>",
+       1, "Players: 2 entries \u2192 1 entry\n"},
+      {"hdr" + players, 1, "header: \"\" \u2192 \"hdr\"\n"},
+  };
+  for (const auto& c : diffs) {
+    WriteBytes(after, c.after);
+    const RunResult compared = RunDatapack({"diff", before.string(), after.string()});
+    EXPECT_EQ(compared.status, c.status) << c.out << compared.err;
+    EXPECT_EQ(compared.out, c.out);
+  }
+  const RunResult missing = RunDatapack({"diff", before.string(), (folder / "none").string()});
+  EXPECT_EQ(missing.status, 2);
+  EXPECT_NE(missing.err.find("datapack: cannot read"), std::string::npos) << missing.err;
+
+  // A NUL in a name cannot be written even by force, and the message shows where it stands.
+  const RunResult nul =
+      RunDatapack({"pack", "--force"}, OneChannel("Val", {"1"}, "A\\u0000B"));
+  EXPECT_EQ(nul.status, 1);
+  EXPECT_NE(nul.err.find(":2:24: A\\x00B: holds a NUL character"), std::string::npos) << nul.err;
+  EXPECT_EQ(nul.out, "");
+}
+
+}  // namespace

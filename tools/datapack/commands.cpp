@@ -52,6 +52,12 @@ class Places {
   std::vector<std::size_t> starts_;
 };
 
+// Text that holds no package: for check, a finding like any other.
+class NotAPackage : public InputError {
+ public:
+  using InputError::InputError;
+};
+
 // A stored package as the engine's reader receives it.
 struct Loaded {
   std::string name;
@@ -83,7 +89,7 @@ Loaded Load(const std::string& file, Scrambling scrambling, const Plugins& plugi
     if (nul != std::string::npos) {
       message += " (the reader stops at the NUL byte at " + places.LineColumn(nul) + ")";
     }
-    throw InputError(message);
+    throw NotAPackage(message);
   }
   loaded.result.package.scrambled = scrambled;
   return loaded;
@@ -229,15 +235,26 @@ void Demo(const DemoOptions& options) {
 }
 
 void Scramble(const ScrambleOptions& options) {
-  std::string bytes = ReadInput(options.input);
-  CheckScramblable(bytes, StreamName(options.input, true));
-  const int length = static_cast<int>(bytes.size());
-  if (options.undo) {
-    Lum_DataPackage::Decrypt(bytes.data(), length);
-  } else {
-    Lum_DataPackage::Encrypt(bytes.data(), length);
+  const auto scrambled = [&] {
+    std::string bytes = ReadInput(options.input);
+    CheckScramblable(bytes, StreamName(options.input, true));
+    const int length = static_cast<int>(bytes.size());
+    if (options.undo) {
+      Lum_DataPackage::Decrypt(bytes.data(), length);
+    } else {
+      Lum_DataPackage::Encrypt(bytes.data(), length);
+    }
+    return bytes;
+  };
+  if (SameFile(options.input, options.output)) {
+    WriteOutput(options.output, scrambled(), options.input);
+    return;
   }
-  WriteOutput(options.output, bytes, options.input);
+  // The output is open before the input is read: a slow input, a pipe say, is interrupted with
+  // the temporary file already there, and its removal is what a user sees.
+  Output out(options.output);
+  out << scrambled();
+  out.Commit();
 }
 
 void Show(const ShowOptions& options) {
@@ -310,9 +327,7 @@ int Check(const CheckOptions& options) {
   Loaded loaded;
   try {
     loaded = Load(options.file, options.scrambling, plugins);
-  } catch (const InputError& error) {
-    // Not a package at all: the one finding.
-    if (std::string_view(error.what()).starts_with("cannot read")) throw;
+  } catch (const NotAPackage& error) {
     Output out("");
     out << error.what() << "\n";
     out.Commit();

@@ -267,10 +267,15 @@ void Output::Commit() {
   ForgetTemporary();
 }
 
+bool SameFile(const std::string& input, const std::string& output) {
+  std::error_code error;
+  return !IsStandardStream(input) && !IsStandardStream(output) &&
+         fs::equivalent(input, output, error);
+}
+
 void WriteOutput(const std::string& path, std::string_view bytes, const std::string& input) {
-  if (!IsStandardStream(input) && !IsStandardStream(path)) {
-    std::error_code error;
-    if (fs::equivalent(input, path, error)) {
+  if (SameFile(input, path)) {
+    {
       if (ReadInput(input) == bytes) return;
       throw InputError("will not write over the input file " + path +
                        ": the output differs from it; write it elsewhere");

@@ -27,6 +27,9 @@ std::string ReadInput(const std::string& path);
 // refused unless the bytes would stay the same.
 void WriteOutput(const std::string& path, std::string_view bytes, const std::string& input = "");
 
+// Whether two paths, neither a standard stream, name one file.
+bool SameFile(const std::string& input, const std::string& output);
+
 // An output written piece by piece; nothing reaches a file's name before Commit.
 class Output {
  public:
