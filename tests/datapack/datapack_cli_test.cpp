@@ -303,7 +303,7 @@ TEST(DatapackCliTest, CheckListsWhatTheReaderWouldChangeAndDiffComparesByPath) {
   };
   const struct {
     std::string package;
-    int status;          // without --strict
+    int status;  // without --strict
     int strictStatus;
     const char* finding;  // expected in standard output
   } checks[] = {
@@ -312,9 +312,12 @@ TEST(DatapackCliTest, CheckListsWhatTheReaderWouldChangeAndDiffComparesByPath) {
       {replaced("12.5", "1 2"), 1, 1, "4:2: error: Players[0].Score: 2 numbers where the reader"},
       {replaced("Ann", std::string(2048, 'a')), 1, 1,
        "3:2: error: Players[0].Name: 2048 characters, but the reader takes"},
-      {replaced("id=\"1\"", "id=\"7\""), 0, 1, "6:1: warning: Players: id 7 on entry 1: ids are not read"},
-      {replaced("</Name>\n", "</Name>\r\n"), 0, 1, "3:32: warning: mixed line breaks: CR LF in a package of LF"},
-      {players + std::string(1, '\0') + "tail", 1, 1, ":9:11: error: 4 bytes after a NUL byte, where the reader stops"},
+      {replaced("id=\"1\"", "id=\"7\""), 0, 1,
+       "6:1: warning: Players: id 7 on entry 1: ids are not read"},
+      {replaced("</Name>\n", "</Name>\r\n"), 0, 1,
+       "3:32: warning: mixed line breaks: CR LF in a package of LF"},
+      {players + std::string(1, '\0') + "tail", 1, 1,
+       ":9:11: error: 4 bytes after a NUL byte, where the reader stops"},
       {replaced("12.5", "12.50"), 0, 1, "warning: written again, the package differs"},
       {"\n<P>\n\t<d>\n\t\t<v Type=\"Val\"> 1 </v>\n\t</d>\n\t<did id=\"0\">\n\t</did>"
        "\n\t<did id=\"1\">\n\t</did>\n</P>",
@@ -330,9 +333,10 @@ TEST(DatapackCliTest, CheckListsWhatTheReaderWouldChangeAndDiffComparesByPath) {
   }
 
   // pack refuses what check finds in the package it would write.
-  const RunResult refused = RunDatapack(
-      {"pack"}, OneChannel("Txt", {"\"" + std::string(2048, 'a') + "\""}, "Players"));
-  EXPECT_NE(refused.err.find("4:15: Players[0].v: 2048 characters, but the reader takes"), std::string::npos)
+  const RunResult refused =
+      RunDatapack({"pack"}, OneChannel("Txt", {"\"" + std::string(2048, 'a') + "\""}, "Players"));
+  EXPECT_NE(refused.err.find("4:15: Players[0].v: 2048 characters, but the reader takes"),
+            std::string::npos)
       << refused.err;
 
   const fs::path folder = ScratchFolder();
@@ -364,8 +368,7 @@ TEST(DatapackCliTest, CheckListsWhatTheReaderWouldChangeAndDiffComparesByPath) {
   EXPECT_NE(missing.err.find("datapack: cannot read"), std::string::npos) << missing.err;
 
   // A NUL in a name cannot be written even by force, and the message shows where it stands.
-  const RunResult nul =
-      RunDatapack({"pack", "--force"}, OneChannel("Val", {"1"}, "A\\u0000B"));
+  const RunResult nul = RunDatapack({"pack", "--force"}, OneChannel("Val", {"1"}, "A\\u0000B"));
   EXPECT_EQ(nul.status, 1);
   EXPECT_NE(nul.err.find(":2:24: A\\x00B: holds a NUL character"), std::string::npos) << nul.err;
   EXPECT_EQ(nul.out, "");

@@ -11,11 +11,11 @@
 #include "tests/datapack/run_datapack.h"
 
 #if !defined(_WIN32)
-#include <csignal>
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
+#include <csignal>
 
 #include "host/channel_library.h"
 #endif
@@ -126,9 +126,9 @@ TEST(DatapackFilesTest, OutputsRespectWhatTheyWriteTo) {
   EXPECT_EQ(RunDatapack({"scramble", empty.string(), "-o", empty.string()}).status, 0);
   EXPECT_EQ(over.status, 0);
 
-  EXPECT_EQ(Names(folder), (std::vector<std::string>{"dangling.pkg", "empty", "fifo", "kept.pkg",
-                                                     "later.pkg", "link.pkg", "players.pkg",
-                                                     "target.pkg"}));
+  EXPECT_EQ(Names(folder),
+            (std::vector<std::string>{"dangling.pkg", "empty", "fifo", "kept.pkg", "later.pkg",
+                                      "link.pkg", "players.pkg", "target.pkg"}));
 #endif
 }
 
@@ -162,9 +162,11 @@ TEST(DatapackFilesTest, InterruptionsAndWriteErrorsLeaveNothingBehind) {
   // A closed pipe fails the write, for every command that writes standard output.
   WriteBytes(folder / "players.pkg", kPlayersPackage);
   const std::string package = (folder / "players.pkg").string();
-  const std::vector<std::vector<std::string>> commands = {
-      {"demo"}, {"show", package}, {"show", "--json", package}, {"scramble", package},
-      {"diff", package, package}};
+  const std::vector<std::vector<std::string> > commands = {{"demo"},
+                                                           {"show", package},
+                                                           {"show", "--json", package},
+                                                           {"scramble", package},
+                                                           {"diff", package, package}};
   for (const auto& command : commands) {
     int pipeEnds[2];
     ASSERT_EQ(pipe(pipeEnds), 0);

@@ -368,8 +368,8 @@ TEST(DatapackRoundTripTest, ShowThenPackGivesTheSameBytesForGeneratedTrees) {
     const RunResult checked = RunDatapack({"check", "--strict", first.string()});
     EXPECT_EQ(checked.status, 0) << context << "\n" << checked.out << checked.err;
     const RunResult plain = RunDatapack({"unscramble", first.string()});
-    const RunResult compared = RunDatapack(
-        {"diff", first.string(), scramble ? "-" : second.string()}, plain.out);
+    const RunResult compared =
+        RunDatapack({"diff", first.string(), scramble ? "-" : second.string()}, plain.out);
     EXPECT_EQ(compared.status, 0) << context << "\n" << compared.out << compared.err;
   }
   std::printf("round trips: %d trees, %zu bytes compared, %d mismatches\n", trees, comparedBytes,

@@ -57,11 +57,58 @@ class ToJson {
   explicit ToJson(bool latin1) : latin1_(latin1) {}
 
   View Text(const std::string& bytes) const {
-    return Scalar(Json(latin1_ ? Latin1ToUtf8(bytes) : bytes).dump());
+    return Scalar(Quoted(latin1_ ? Latin1ToUtf8(bytes) : bytes));
+  }
+
+  // As the JSON library writes strings, without making one of its documents for each.
+  static std::string Quoted(std::string_view utf8) {
+    std::string out;
+    out.reserve(utf8.size() + 2);
+    out += '"';
+    for (char c : utf8) {
+      const auto byte = static_cast<unsigned char>(c);
+      switch (c) {
+        case '"':
+          out += "\\\"";
+          break;
+        case '\\':
+          out += "\\\\";
+          break;
+        case '\b':
+          out += "\\b";
+          break;
+        case '\f':
+          out += "\\f";
+          break;
+        case '\n':
+          out += "\\n";
+          break;
+        case '\r':
+          out += "\\r";
+          break;
+        case '\t':
+          out += "\\t";
+          break;
+        default:
+          if (byte < 0x20) {
+            constexpr char kDigits[] = "0123456789abcdef";
+            out += {'\\', 'u', '0', '0', kDigits[byte >> 4], kDigits[byte & 15]};
+          } else {
+            out += c;
+          }
+      }
+    }
+    out += '"';
+    return out;
   }
 
   static View Number(float number) {
-    if (std::isfinite(number)) return Scalar(Json(number).dump());
+    if (std::isfinite(number)) {
+      // The library's own shortest form ("7.0", "1e+20"), without a serializer for each number.
+      char text[64];
+      return Scalar(
+          std::string(text, nlohmann::detail::to_chars(text, text + sizeof(text), number)));
+    }
     if (std::isinf(number)) return Scalar(number < 0 ? "\"-inf\"" : "\"inf\"");
     return Scalar(std::signbit(number) ? "\"-nan\"" : "\"nan\"");
   }
@@ -442,7 +489,7 @@ void WritePackageJson(const Package& package, Output& out) {
       case 1:
         return Scalar(package.crlf ? "\"CRLF\"" : "\"LF\"");
       case 2:
-        return Scalar(Json(std::string(latin1 ? kLatin1 : kUtf8)).dump());
+        return Scalar(ToJson::Quoted(latin1 ? kLatin1 : kUtf8));
     }
     if (i == 3 && package.scrambled) return Scalar("true");
     return to.Shape(package.top, &package.entries);

@@ -75,6 +75,7 @@ class Parser {
   }
 
   const std::vector<datapack::Note>& Notes() const { return notes_; }
+  std::optional<std::size_t> FirstBreak(bool crlf) const { return firstBreak[crlf]; }
 
   FoundDirectory Directory(Layout& layout, int depth = 1) {
     const Tag open = Take();
@@ -179,7 +180,20 @@ class Parser {
                                     : "expected a tag, found " + Quoted(text_.substr(at_)));
     }
     at_ = tag->end;
+    NoticeBreak(tag->offset);
     return *tag;
+  }
+
+  // Where the line break before a tag is the first of its kind: LF or CR LF.
+  std::optional<std::size_t> firstBreak[2];
+
+  void NoticeBreak(std::size_t tag) {
+    std::size_t at = tag;
+    while (at > 0 && text_[at - 1] == '\t')
+      --at;
+    if (at == 0 || text_[at - 1] != '\n') return;
+    const bool crlf = at > 1 && text_[at - 2] == '\r';
+    if (!firstBreak[crlf]) firstBreak[crlf] = at - 1;
   }
 
   void Close(std::string_view name) {
@@ -216,7 +230,12 @@ class Parser {
     std::size_t count = 0;
     for (std::size_t at = 0; at < value.size();) {
       const std::size_t end = std::min(value.find_first_of(" \t\r\n", at), value.size());
-      const std::string number(value.substr(at, end - at));
+      std::string number(value.substr(at, end - at));
+      // A matrix's rows end with a comma right after their last number.
+      if (kind == Kind::kMatrix && count % 4 == 3 && count < 15) {
+        if (!number.ends_with(',')) return "a matrix row without the \",\" that ends it";
+        number.pop_back();
+      }
       char* stop = nullptr;
       std::strtof(number.c_str(), &stop);
       if (stop != number.c_str() + number.size()) {
@@ -316,7 +335,16 @@ Structure FindStructure(std::string_view text) {
       std::string_view header = text.substr(0, at);
       const std::string_view newline = crlf ? "\r\n" : "\n";
       if (header.ends_with(newline)) header.remove_suffix(newline.size());
-      return {std::string(header), crlf, layout.ToShape(), std::move(found), parser.Notes()};
+      Structure structure{std::string(header), crlf, layout.ToShape(), std::move(found),
+                          parser.Notes()};
+      // The reader takes either line break; writing again gives one kind only.
+      if (const auto other = parser.FirstBreak(!crlf)) {
+        structure.notes.push_back({*other, true,
+                                   std::string("mixed line breaks: ") + (crlf ? "LF" : "CR LF") +
+                                       " in a package of " + (crlf ? "CR LF" : "LF") +
+                                       " line breaks"});
+      }
+      return structure;
     } catch (const StructureError& error) {
       if (!furthest || error.offset() > furthest->offset()) furthest = error;
     }
