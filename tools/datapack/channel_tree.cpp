@@ -48,6 +48,7 @@ struct ChannelTree::Node {
   std::vector<std::unique_ptr<Node>> directories;
   const std::vector<Entry>* supply = nullptr;
   std::vector<Entry> collected;
+  std::function<void(Entry&&)> sink;  // takes each entry instead of `collected`
 
   Node(const Plugins& plugins, const Shape& shape)
       : directory(Created(*plugins.directories)), tag(Created(*plugins.texts)) {
@@ -108,7 +109,11 @@ struct ChannelTree::Node {
       entry.directories.push_back(std::move(sub->collected));
       sub->collected.clear();
     }
-    collected.push_back(std::move(entry));
+    if (sink) {
+      sink(std::move(entry));
+    } else {
+      collected.push_back(std::move(entry));
+    }
   }
 
   void Collect() {
@@ -174,9 +179,11 @@ std::string ChannelTree::Write(const std::string& header, const std::vector<Entr
   return buffer;
 }
 
-std::vector<Entry> ChannelTree::Read(std::string& text, bool crlf) {
+std::vector<Entry> ChannelTree::Read(std::string& text, bool crlf,
+                                     const std::function<void(Entry&&)>& sink) {
   if (text.size() >= INT_MAX) throw InputError("the package is too large to be read");
   top_->Collect();
+  top_->sink = sink;
   top_->Directory().ReadFromBuffer(text.data(), static_cast<int>(text.size() + 1), !crlf, false);
   return std::move(top_->collected);
 }

@@ -4,6 +4,7 @@
 // them from the reader.
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -28,7 +29,10 @@ class ChannelTree {
 
   // The entries the tree receives from reading the text, read where it stands: the reader only
   // looks, and the string's own terminating NUL ends it.
-  std::vector<Entry> Read(std::string& text, bool crlf);
+  // With a sink, each entry of the top directory goes there once read instead, and nothing is
+  // returned: the entries need never be held all at once.
+  std::vector<Entry> Read(std::string& text, bool crlf,
+                          const std::function<void(Entry&&)>& sink = nullptr);
 
  private:
   struct Node;

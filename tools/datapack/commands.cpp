@@ -287,7 +287,7 @@ void Show(const ShowOptions& options) {
 
 void Pack(const PackOptions& options) {
   const std::string name = StreamName(options.file, true);
-  const std::string text = ReadInput(options.file);
+  std::string text = ReadInput(options.file);
   Package package;
   try {
     package = PackageFromJson(text);
@@ -298,6 +298,7 @@ void Pack(const PackOptions& options) {
   if (options.scramble) package.scrambled = true;
 
   const auto refuse = [&](const std::vector<Problem>& problems, bool forceable) {
+    if (text.empty()) text = ReadInput(options.file);
     Places places(name, text);
     std::string message;
     for (const Problem& problem : problems) {
@@ -311,13 +312,17 @@ void Pack(const PackOptions& options) {
   if (!options.force && !problems.empty()) refuse(problems, true);
   std::erase_if(problems, [](const Problem& problem) { return problem.forceable; });
   if (!problems.empty()) refuse(problems, false);
+  // A file can be read again for a message; the package needs the room meanwhile.
+  if (!IsStandardStream(options.file)) text = std::string();
 
   const Plugins plugins = LoadPlugins(pluginDir);
   std::string bytes = WritePackage(plugins, package, false);
   if (!options.force) {
     if (const auto problem = CheckReadBack(plugins, package, bytes)) refuse({*problem}, true);
   }
-  if (package.scrambled) {
+  const bool scramble = package.scrambled;
+  package = Package();
+  if (scramble) {
     // The amount each byte is shifted by depends only on its place: the NUL the plug-in
     // scrambles last changes nothing before it.
     CheckScramblable(bytes, name);

@@ -260,6 +260,8 @@ class Printer {
 
 class FromJson {
  public:
+  explicit FromJson(bool latin1 = false) : latin1_(latin1) {}
+
   Package Read(const Json& root) {
     const Place place{"", ""};
     Expect(root, place, Json::value_t::object, "an object");
@@ -365,6 +367,7 @@ class FromJson {
     Fail(place, "expected a number, \"inf\", \"-inf\", \"nan\" or \"-nan\"");
   }
 
+ public:
   datapack::Shape Shape(const Json& json, const Place& place, int depth) {
     const bool top = depth == 0;
     if (depth >= Lum_DataPackage::kMaxNesting) {
@@ -401,33 +404,39 @@ class FromJson {
     return shape;
   }
 
+ private:
   std::vector<Entry> Entries(const datapack::Shape& shape, const Json& json, const Place& place) {
     std::vector<Entry> entries;
-    for (std::size_t i = 0; i < Array(json, place).size(); ++i) {
-      const Place item = place.Entry(i);
-      Keys(json[i], item, {kValuesKey, kDirectoriesKey});
-      Entry entry;
-      const Json* values = Find(json[i], item, kValuesKey);
-      if (!shape.data.empty() && !values) Fail(item, "an entry without \"values\"");
-      if (values) Array(*values, item.Key(kValuesKey), shape.data.size());
-      for (std::size_t j = 0; j < shape.data.size(); ++j) {
-        const Place value = item.Key(kValuesKey).Item(j).Named(shape.data[j].name);
-        entry.values.push_back(Value(shape.data[j].kind, (*values)[j], value));
-      }
-      const Json* directories = Find(json[i], item, kDirectoriesKey);
-      if (!shape.directories.empty() && !directories)
-        Fail(item, "an entry without \"directories\"");
-      if (directories) Array(*directories, item.Key(kDirectoriesKey), shape.directories.size());
-      for (std::size_t k = 0; k < shape.directories.size(); ++k) {
-        const datapack::Shape& sub = shape.directories[k];
-        const Place list = item.Key(kDirectoriesKey).Item(k).Named(sub.name);
-        entry.directories.push_back(Entries(sub, (*directories)[k], list));
-      }
-      entries.push_back(std::move(entry));
-    }
+    for (std::size_t i = 0; i < Array(json, place).size(); ++i)
+      entries.push_back(EntryFrom(shape, json[i], place.Entry(i)));
     return entries;
   }
 
+ public:
+  bool latin1() const { return latin1_; }
+
+  Entry EntryFrom(const datapack::Shape& shape, const Json& json, const Place& item) {
+    Keys(json, item, {kValuesKey, kDirectoriesKey});
+    Entry entry;
+    const Json* values = Find(json, item, kValuesKey);
+    if (!shape.data.empty() && !values) Fail(item, "an entry without \"values\"");
+    if (values) Array(*values, item.Key(kValuesKey), shape.data.size());
+    for (std::size_t j = 0; j < shape.data.size(); ++j) {
+      const Place value = item.Key(kValuesKey).Item(j).Named(shape.data[j].name);
+      entry.values.push_back(Value(shape.data[j].kind, (*values)[j], value));
+    }
+    const Json* directories = Find(json, item, kDirectoriesKey);
+    if (!shape.directories.empty() && !directories) Fail(item, "an entry without \"directories\"");
+    if (directories) Array(*directories, item.Key(kDirectoriesKey), shape.directories.size());
+    for (std::size_t k = 0; k < shape.directories.size(); ++k) {
+      const datapack::Shape& sub = shape.directories[k];
+      const Place list = item.Key(kDirectoriesKey).Item(k).Named(sub.name);
+      entry.directories.push_back(Entries(sub, (*directories)[k], list));
+    }
+    return entry;
+  }
+
+ private:
   datapack::Value Value(Kind kind, const Json& json, const Place& place) const {
     switch (kind) {
       case Kind::kText:
@@ -452,6 +461,104 @@ class FromJson {
   }
 
   bool latin1_ = false;
+};
+
+// The JSON text parsed with each entry of the top directory made into an Entry as soon as it is
+// complete and dropped from the document: the document never holds the package's values. That
+// needs the directory's shape and the encoding before its entries, as show --json prints them;
+// other texts are read whole.
+class StreamedReader {
+ public:
+  struct Unstreamable {};
+
+  Package Read(std::string_view text) {
+    Json root = Json::parse(text, [this](int, Json::parse_event_t event, Json& parsed) {
+      return Handle(event, parsed);
+    });
+    FromJson from;
+    Package package = from.Read(root);
+    if (streamed_) {
+      if (from.latin1() != latin1_ || package.top != *shape_) throw Unstreamable();
+      package.entries = std::move(entries_);
+    }
+    return package;
+  }
+
+ private:
+  using Event = Json::parse_event_t;
+  struct Frame {
+    bool array = false;
+    std::string key;
+    std::size_t count = 0;
+  };
+
+  // Whether the parser keeps what it has just read.
+  bool Handle(Event event, Json& parsed) {
+    switch (event) {
+      case Event::object_start:
+      case Event::array_start:
+        frames_.push_back({event == Event::array_start, "", 0});
+        return true;
+      case Event::key:
+        frames_.back().key = parsed.get<std::string>();
+        return true;
+      case Event::object_end:
+      case Event::array_end:
+        frames_.pop_back();
+        if (frames_.empty()) return true;
+        break;
+      case Event::value:
+        if (frames_.empty()) return true;
+        break;
+    }
+    const bool keep = Complete(parsed, event == Event::object_end);
+    if (frames_.back().array) ++frames_.back().count;
+    return keep;
+  }
+
+  bool At(std::initializer_list<std::string_view> keys) const {
+    if (frames_.size() != keys.size()) return false;
+    std::size_t i = 0;
+    for (std::string_view key : keys) {
+      if (frames_[i].array || frames_[i].key != key) return false;
+      ++i;
+    }
+    return true;
+  }
+
+  // A value complete where the frames say.
+  bool Complete(Json& parsed, bool object) {
+    if (At({kEncodingKey})) {
+      latin1_ = parsed == Json(std::string(kLatin1));
+      if (streamed_) throw Unstreamable();
+    } else if (frames_.size() == 2 && At({kDirectoryKey, frames_[1].key}) &&
+               frames_[1].key != kEntriesKey) {
+      if (streamed_) throw Unstreamable();  // the shape has changed under its entries
+      parts_[frames_[1].key] = parsed;
+    } else if (object && frames_.size() == 3 && !frames_[0].array &&
+               frames_[0].key == kDirectoryKey && !frames_[1].array &&
+               frames_[1].key == kEntriesKey && frames_[2].array) {
+      if (!shape_) {
+        if (frames_[2].count != 0 || !parts_.contains(kNameKey)) return true;
+        shape_ = FromJson(latin1_).Shape(parts_, top_, 0);
+      }
+      if (!streamed_ && frames_[2].count != 0) return true;
+      streamed_ = true;
+      const Place list = top_.Named(shape_->name).Key(kEntriesKey);
+      entries_.push_back(
+          FromJson(latin1_).EntryFrom(*shape_, parsed, list.Entry(frames_[2].count)));
+      return false;
+    }
+    return true;
+  }
+
+  std::vector<Frame> frames_;
+  Json parts_ = Json::object();
+  const Place top_ = Place{"", ""}.Key(kDirectoryKey);
+  std::optional<datapack::Shape> shape_;
+  std::vector<Entry> entries_;
+  bool latin1_ = false;
+  bool streamed_ = false;
 };
 
 }  // namespace
@@ -499,6 +606,13 @@ void WritePackageJson(const Package& package, Output& out) {
 }
 
 Package PackageFromJson(std::string_view text) {
+  try {
+    return StreamedReader().Read(text);
+  } catch (const StreamedReader::Unstreamable&) {
+  } catch (const Json::exception&) {
+  } catch (const JsonError&) {
+    // Read whole, the text gives the message it always gives.
+  }
   Json root;
   try {
     root = Json::parse(text);

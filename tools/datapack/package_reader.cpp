@@ -46,42 +46,76 @@ std::string Written(const Value& value) {
   return out;
 }
 
+// Values compare as the package writes them; most are simply the same.
+bool SameWritten(const Value& meant, const Value& read) {
+  if (meant.index() == read.index() && !std::holds_alternative<std::string>(meant)) {
+    const auto bytes = [](const Value& value) {
+      return std::visit(
+          [](const auto& v) {
+            return std::string_view(reinterpret_cast<const char*>(&v), sizeof(v));
+          },
+          value);
+    };
+    if (bytes(meant) == bytes(read)) return true;
+  }
+  return Written(meant) == Written(read);
+}
+
+Problem Report(const Place& place, const std::string& message) {
+  return Problem{place.pointer, place.path + ": " + message};
+}
+
+std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& meantEntries,
+                                  const Shape& read, const std::vector<Entry>& readEntries,
+                                  const Place& list);
+
+// The first place where an entry read back differs from what was meant.
+std::optional<Problem> EntryDifference(const Shape& meant, const Entry& meantEntry,
+                                       const Shape& read, const Entry& readEntry,
+                                       const Place& entry) {
+  for (std::size_t j = 0; j < meant.data.size(); ++j) {
+    const Place value = entry.Key(kValuesKey).Item(j).Named(meant.data[j].name);
+    if (j >= read.data.size() || read.data[j] != meant.data[j]) {
+      return Report(value, "the reader does not find this element");
+    }
+    if (!SameWritten(meantEntry.values[j], readEntry.values[j])) {
+      return Report(value, "reads back as " + Written(readEntry.values[j]));
+    }
+  }
+  for (std::size_t k = 0; k < meant.directories.size(); ++k) {
+    const Shape& sub = meant.directories[k];
+    const Place subList = entry.Key(kDirectoriesKey).Item(k).Named(sub.name);
+    if (k >= read.directories.size()) {
+      return Report(subList, "the reader does not find this directory");
+    }
+    if (auto problem = Difference(sub, meantEntry.directories[k], read.directories[k],
+                                  readEntry.directories[k], subList)) {
+      return problem;
+    }
+  }
+  return std::nullopt;
+}
+
+std::optional<Problem> CountDifference(std::size_t meantCount, std::size_t readCount,
+                                       const Place& list) {
+  if (meantCount == readCount) return std::nullopt;
+  return Report(list, Counted(meantCount, "entry", "entries") + " read back as " +
+                          std::to_string(readCount) +
+                          ": the reader, searching by name, meets another directory's tags");
+}
+
 // The first place where what was read back differs from what was meant.
 std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& meantEntries,
                                   const Shape& read, const std::vector<Entry>& readEntries,
                                   const Place& list) {
-  const auto report = [](const Place& place, const std::string& message) {
-    return Problem{place.pointer, place.path + ": " + message};
-  };
   const std::size_t meantCount = WrittenEmpty(meant, meantEntries) ? 0 : meantEntries.size();
   const std::size_t readCount = WrittenEmpty(read, readEntries) ? 0 : readEntries.size();
-  if (meant.name != read.name) return report(list, "the name reads back as \"" + read.name + "\"");
-  if (meantCount != readCount) {
-    return report(list, std::to_string(meantCount) + " entries read back as " +
-                            std::to_string(readCount) +
-                            ": the reader, searching by name, meets another directory's tags");
-  }
+  if (meant.name != read.name) return Report(list, "the name reads back as \"" + read.name + "\"");
+  if (auto problem = CountDifference(meantCount, readCount, list)) return problem;
   for (std::size_t i = 0; i < meantCount; ++i) {
-    const Place entry = list.Entry(i);
-    for (std::size_t j = 0; j < meant.data.size(); ++j) {
-      const Place value = entry.Key(kValuesKey).Item(j).Named(meant.data[j].name);
-      if (j >= read.data.size() || read.data[j] != meant.data[j]) {
-        return report(value, "the reader does not find this element");
-      }
-      const std::string meantValue = Written(meantEntries[i].values[j]);
-      const std::string readValue = Written(readEntries[i].values[j]);
-      if (meantValue != readValue) return report(value, "reads back as " + readValue);
-    }
-    for (std::size_t k = 0; k < meant.directories.size(); ++k) {
-      const Shape& sub = meant.directories[k];
-      const Place subList = entry.Key(kDirectoriesKey).Item(k).Named(sub.name);
-      if (k >= read.directories.size()) {
-        return report(subList, "the reader does not find this directory");
-      }
-      if (auto problem = Difference(sub, meantEntries[i].directories[k], read.directories[k],
-                                    readEntries[i].directories[k], subList)) {
-        return problem;
-      }
+    if (auto problem =
+            EntryDifference(meant, meantEntries[i], read, readEntries[i], list.Entry(i))) {
+      return problem;
     }
   }
   return std::nullopt;
@@ -109,25 +143,41 @@ std::vector<Shortfall> FindShortfalls(const ReadResult& result) {
 }
 
 std::optional<Problem> CheckReadBack(const Plugins& plugins, const Package& package,
-                                     const std::string& written) {
+                                     std::string& written) {
   const Place top = Place{"", ""}.Key(kDirectoryKey).Named(package.top.name);
-  ReadResult back;
-  std::string text = written;
+  Structure structure;
   try {
-    back = ReadPackage(plugins, text);
+    structure = FindStructure(written);
   } catch (const StructureError& error) {
     return Problem{top.pointer,
                    "the package written from it does not read back: " + std::string(error.what())};
   }
-  if (WritePackage(plugins, back.package, false) == written) return std::nullopt;
-  if (back.package.header != package.header) {
-    return Problem{"/header", "header: reads back as \"" + back.package.header + "\""};
+  if (structure.header != package.header) {
+    return Problem{"/header", "header: reads back as \"" + structure.header + "\""};
   }
-  if (auto problem = Difference(package.top, package.entries, back.package.top,
-                                back.package.entries, top.Key(kEntriesKey))) {
-    return problem;
+  const Place list = top.Key(kEntriesKey);
+  if (structure.top.name != package.top.name) {
+    return Report(list, "the name reads back as \"" + structure.top.name + "\"");
   }
-  return Problem{top.pointer, top.path + ": does not read back as written"};
+  // Each entry is compared as it is read, and dropped.
+  const bool holdsNothing = package.top.data.empty() && package.top.directories.empty();
+  std::size_t count = 0;
+  std::optional<Problem> first;
+  const auto compare = [&](Entry&& entry) {
+    const std::size_t i = count++;
+    if (!first && i < package.entries.size()) {
+      first = EntryDifference(package.top, package.entries[i], structure.top, entry, list.Entry(i));
+    }
+  };
+  const std::vector<Entry> read =
+      ChannelTree(plugins, structure.top)
+          .Read(written, structure.crlf, holdsNothing ? nullptr : std::function(compare));
+  const std::size_t meantCount =
+      WrittenEmpty(package.top, package.entries) ? 0 : package.entries.size();
+  const std::size_t readCount =
+      holdsNothing ? (WrittenEmpty(structure.top, read) ? 0 : read.size()) : count;
+  if (auto problem = CountDifference(meantCount, readCount, list)) return problem;
+  return first;
 }
 
 }  // namespace datapack

@@ -32,7 +32,8 @@ std::vector<Shortfall> FindShortfalls(const ReadResult& result);
 
 // Whether `written`, the package of `package`, reads back and writes again to the same bytes; if
 // not, the first value of `package` that does not come back.
+// The text is read where it stands, and left as it was.
 std::optional<Problem> CheckReadBack(const Plugins& plugins, const Package& package,
-                                     const std::string& written);
+                                     std::string& written);
 
 }  // namespace datapack
