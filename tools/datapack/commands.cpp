@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <climits>
 #include <cstdio>
+#include <filesystem>
 #include <optional>
 #include <string_view>
 
@@ -66,7 +67,8 @@ struct Loaded {
   ReadResult result;
 };
 
-Loaded Load(const std::string& file, Scrambling scrambling, const Plugins& plugins) {
+Loaded Load(const std::string& file, Scrambling scrambling, const Plugins& plugins,
+            const EntrySink& sink = nullptr) {
   Loaded loaded;
   loaded.name = StreamName(file, true);
   loaded.text = ReadInput(file);
@@ -82,7 +84,7 @@ Loaded Load(const std::string& file, Scrambling scrambling, const Plugins& plugi
     loaded.text.resize(nul);  // the reader stops there
   }
   try {
-    loaded.result = ReadPackage(plugins, loaded.text);
+    loaded.result = ReadPackage(plugins, loaded.text, sink);
   } catch (const StructureError& error) {
     Places places(loaded.name, loaded.text);
     std::string message = places.At(error.offset()) + error.what();
@@ -146,52 +148,60 @@ class Differ {
     out_ << path << ": " << before << " \u2192 " << after << "\n";
   }
 
-  void Directory(const Shape& a, const std::vector<Entry>& aEntries, const Shape& b,
-                 const std::vector<Entry>& bEntries, const std::string& parent) {
-    const std::string path = Path(parent, a.name);
+  // Whether the two directories' names and data channels allow comparing their entries.
+  bool Shapes(const Shape& a, const Shape& b, const std::string& path) {
     if (a.name != b.name) {
       Report(path, "directory \"" + ShownName(a.name) + "\"",
              "directory \"" + ShownName(b.name) + "\"");
-      return;
+      return false;
     }
-    const std::size_t data = std::min(a.data.size(), b.data.size());
-    std::vector<bool> sameSlot(data);
+    const auto slot = [](const Shape& shape, std::size_t j) {
+      return j < shape.data.size() ? ShownName(shape.data[j].name) + " (" +
+                                         std::string(KindName(shape.data[j].kind)) + ")"
+                                   : std::string("nothing");
+    };
     for (std::size_t j = 0; j < std::max(a.data.size(), b.data.size()); ++j) {
-      const auto slot = [](const Shape& shape, std::size_t j) {
-        return j < shape.data.size() ? ShownName(shape.data[j].name) + " (" +
-                                           std::string(KindName(shape.data[j].kind)) + ")"
-                                     : std::string("nothing");
-      };
-      if (j < data && a.data[j] == b.data[j]) {
-        sameSlot[j] = true;
-      } else {
+      if (j >= a.data.size() || j >= b.data.size() || a.data[j] != b.data[j]) {
         Report(path + ".data[" + std::to_string(j) + "]", slot(a, j), slot(b, j));
       }
     }
-    if (aEntries.size() != bEntries.size()) {
-      Report(path, Counted(aEntries.size(), "entry", "entries"),
-             Counted(bEntries.size(), "entry", "entries"));
+    return true;
+  }
+
+  void Entries(std::size_t before, std::size_t after, const std::string& path) {
+    if (before != after) {
+      Report(path, Counted(before, "entry", "entries"), Counted(after, "entry", "entries"));
     }
-    for (std::size_t i = 0; i < std::min(aEntries.size(), bEntries.size()); ++i) {
-      const std::string entry = path + "[" + std::to_string(i) + "]";
-      for (std::size_t j = 0; j < data; ++j) {
-        if (!sameSlot[j]) continue;
-        const std::string before = ValueText(aEntries[i].values[j]);
-        const std::string after = ValueText(bEntries[i].values[j]);
-        if (before != after) Report(Path(entry, a.data[j].name), before, after);
-      }
-      const std::size_t subs = std::max(a.directories.size(), b.directories.size());
-      for (std::size_t k = 0; k < subs; ++k) {
-        if (k >= a.directories.size() || k >= b.directories.size()) {
-          const Shape& only = k < a.directories.size() ? a.directories[k] : b.directories[k];
-          Report(Path(entry, only.name), k < a.directories.size() ? "a directory" : "nothing",
-                 k < a.directories.size() ? "nothing" : "a directory");
-          continue;
-        }
-        Directory(a.directories[k], aEntries[i].directories[k], b.directories[k],
-                  bEntries[i].directories[k], entry);
-      }
+  }
+
+  void EntryValues(const Shape& a, const Entry& aEntry, const Shape& b, const Entry& bEntry,
+                   const std::string& entry) {
+    for (std::size_t j = 0; j < std::min(a.data.size(), b.data.size()); ++j) {
+      if (a.data[j] != b.data[j]) continue;
+      const std::string before = ValueText(aEntry.values[j]);
+      const std::string after = ValueText(bEntry.values[j]);
+      if (before != after) Report(Path(entry, a.data[j].name), before, after);
     }
+    const std::size_t subs = std::max(a.directories.size(), b.directories.size());
+    for (std::size_t k = 0; k < subs; ++k) {
+      if (k >= a.directories.size() || k >= b.directories.size()) {
+        const Shape& only = k < a.directories.size() ? a.directories[k] : b.directories[k];
+        Report(Path(entry, only.name), k < a.directories.size() ? "a directory" : "nothing",
+               k < a.directories.size() ? "nothing" : "a directory");
+        continue;
+      }
+      Directory(a.directories[k], aEntry.directories[k], b.directories[k], bEntry.directories[k],
+                entry);
+    }
+  }
+
+  void Directory(const Shape& a, const std::vector<Entry>& aEntries, const Shape& b,
+                 const std::vector<Entry>& bEntries, const std::string& parent) {
+    const std::string path = Path(parent, a.name);
+    if (!Shapes(a, b, path)) return;
+    Entries(aEntries.size(), bEntries.size(), path);
+    for (std::size_t i = 0; i < std::min(aEntries.size(), bEntries.size()); ++i)
+      EntryValues(a, aEntries[i], b, bEntries[i], path + "[" + std::to_string(i) + "]");
   }
 
  private:
@@ -287,12 +297,24 @@ void Show(const ShowOptions& options) {
 
 void Pack(const PackOptions& options) {
   const std::string name = StreamName(options.file, true);
-  std::string text = ReadInput(options.file);
+  std::string text;
   Package package;
-  try {
-    package = PackageFromJson(text);
-  } catch (const JsonError& error) {
-    throw InputError(Places(name, text).At(error.OffsetIn(text)) + error.what());
+  // A regular file is parsed as it is read; any trouble, and it is read whole for the message.
+  std::optional<Package> streamed;
+  std::error_code error;
+  if (!IsStandardStream(options.file) && std::filesystem::is_regular_file(options.file, error) &&
+      std::filesystem::file_size(options.file, error) <= kLargestInput) {
+    streamed = PackageFromJsonFile(options.file);
+  }
+  if (streamed) {
+    package = std::move(*streamed);
+  } else {
+    text = ReadInput(options.file);
+    try {
+      package = PackageFromJson(text);
+    } catch (const JsonError& error) {
+      throw InputError(Places(name, text).At(error.OffsetIn(text)) + error.what());
+    }
   }
   if (options.crlf) package.crlf = true;
   if (options.scramble) package.scrambled = true;
@@ -359,17 +381,29 @@ int Diff(const DiffOptions& options) {
   const Plugins plugins = LoadPlugins(pluginDir);
   Loaded before = Load(options.before, options.scrambling, plugins);
   before.text = std::string();
-  Loaded after = Load(options.after, options.scrambling, plugins);
-  after.text = std::string();
   const Package& a = before.result.package;
-  const Package& b = after.result.package;
+  const std::string path = ShownName(a.top.name);
   Output out("");
   Differ differ(out);
+  // The second package's entries are compared as they are read, and dropped.
+  std::size_t count = 0;
+  bool comparable = false;
+  const auto compare = [&](const Shape& top, Entry&& entry) {
+    if (count == 0) comparable = differ.Shapes(a.top, top, path);
+    if (comparable && count < a.entries.size()) {
+      differ.EntryValues(a.top, a.entries[count], top, entry,
+                         path + "[" + std::to_string(count) + "]");
+    }
+    ++count;
+  };
+  const Loaded after = Load(options.after, options.scrambling, plugins, compare);
+  const Package& b = after.result.package;
+  if (count == 0) comparable = differ.Shapes(a.top, b.top, path);
+  if (comparable) differ.Entries(a.entries.size(), count, path);
   if (a.header != b.header) differ.Report("header", ValueText(a.header), ValueText(b.header));
   if (a.crlf != b.crlf) {
     differ.Report("line breaks", a.crlf ? "CRLF" : "LF", b.crlf ? "CRLF" : "LF");
   }
-  differ.Directory(a.top, a.entries, b.top, b.entries, "");
   out.Commit();
   return differ.different ? 1 : 0;
 }

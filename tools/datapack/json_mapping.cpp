@@ -2,7 +2,9 @@
 
 #include <algorithm>
 #include <cmath>
+#include <fstream>
 #include <functional>
+#include <iterator>
 #include <limits>
 #include <nlohmann/json.hpp>
 
@@ -471,10 +473,12 @@ class StreamedReader {
  public:
   struct Unstreamable {};
 
-  Package Read(std::string_view text) {
-    Json root = Json::parse(text, [this](int, Json::parse_event_t event, Json& parsed) {
-      return Handle(event, parsed);
-    });
+  // `input` is a text, or a pair of iterators over one.
+  template <typename... Input>
+  Package Read(Input&&... input) {
+    Json root = Json::parse(
+        std::forward<Input>(input)...,
+        [this](int, Json::parse_event_t event, Json& parsed) { return Handle(event, parsed); });
     FromJson from;
     Package package = from.Read(root);
     if (streamed_) {
@@ -603,6 +607,19 @@ void WritePackageJson(const Package& package, Output& out) {
   });
   Printer(out).Print(root, 0);
   out << "\n";
+}
+
+std::optional<Package> PackageFromJsonFile(const std::string& path) {
+  std::ifstream file(path, std::ios::binary);
+  if (!file) return std::nullopt;
+  try {
+    return StreamedReader().Read(std::istreambuf_iterator<char>(file),
+                                 std::istreambuf_iterator<char>());
+  } catch (const StreamedReader::Unstreamable&) {
+  } catch (const Json::exception&) {
+  } catch (const JsonError&) {
+  }
+  return std::nullopt;
 }
 
 Package PackageFromJson(std::string_view text) {

@@ -74,4 +74,8 @@ void WritePackageJson(const Package& package, Output& out);
 // Throws JsonError.
 Package PackageFromJson(std::string_view text);
 
+// The package of a JSON file read as it streams past, never held whole; nothing when the file
+// needs reading whole (a message to place, entries before their shape), as PackageFromJson does.
+std::optional<Package> PackageFromJsonFile(const std::string& path);
+
 }  // namespace datapack

@@ -123,10 +123,12 @@ std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& 
 
 }  // namespace
 
-ReadResult ReadPackage(const Plugins& plugins, std::string& text) {
+ReadResult ReadPackage(const Plugins& plugins, std::string& text, const EntrySink& sink) {
   Structure structure = FindStructure(text);
   ReadResult result;
-  result.package.entries = ChannelTree(plugins, structure.top).Read(text, structure.crlf);
+  std::function<void(Entry &&)> each;
+  if (sink) each = [&](Entry&& entry) { sink(structure.top, std::move(entry)); };
+  result.package.entries = ChannelTree(plugins, structure.top).Read(text, structure.crlf, each);
   result.package.header = std::move(structure.header);
   result.package.crlf = structure.crlf;
   result.notes = std::move(structure.notes);

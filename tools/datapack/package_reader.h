@@ -2,6 +2,7 @@
 // tree, the plug-in's reader fills it.
 #pragma once
 
+#include <functional>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -21,7 +22,10 @@ struct ReadResult {
 };
 
 // Throws StructureError when the text does not hold a package.
-ReadResult ReadPackage(const Plugins& plugins, std::string& text);
+// With a sink, each entry of the top directory goes there as it is read, with the top directory's
+// shape, and the result holds no entries.
+using EntrySink = std::function<void(const Shape& top, Entry&& entry)>;
+ReadResult ReadPackage(const Plugins& plugins, std::string& text, const EntrySink& sink = nullptr);
 
 // Where the text holds another number of entries than the reader took.
 struct Shortfall {
