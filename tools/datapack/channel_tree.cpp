@@ -9,6 +9,7 @@
 #include "host/vector_channel.h"
 #include "plugin/data_package.h"
 #include "tools/datapack/input_error.h"
+#include "tools/datapack/progress.h"
 
 namespace datapack {
 namespace {
@@ -49,6 +50,8 @@ struct ChannelTree::Node {
   const std::vector<Entry>* supply = nullptr;
   std::vector<Entry> collected;
   std::function<void(Entry&&)> sink;  // takes each entry instead of `collected`
+  Progress* progress = nullptr;       // counts the entries of the top directory
+  std::uint64_t handled = 0;
 
   Node(const Plugins& plugins, const Shape& shape)
       : directory(Created(*plugins.directories)), tag(Created(*plugins.texts)) {
@@ -87,6 +90,7 @@ struct ChannelTree::Node {
 
   // Before the writer packs an entry: its values, and the entries of each sub-directory in it.
   void SupplyEntry() {
+    if (progress) progress->Update(++handled);
     const Entry& entry = (*supply)[static_cast<std::size_t>(index.GetValue())];
     for (std::size_t i = 0; i < data.size(); ++i)
       SetValue(i, entry.values[i]);
@@ -102,6 +106,7 @@ struct ChannelTree::Node {
 
   // After the reader has filled an entry: its values, and what each sub-directory took meanwhile.
   void CollectEntry() {
+    if (progress) progress->Update(++handled);
     Entry entry;
     for (std::size_t i = 0; i < data.size(); ++i)
       entry.values.push_back(GetValue(i));
@@ -169,10 +174,19 @@ std::string ChannelTree::Write(const std::string& header, const std::vector<Entr
   Lum_DataPackage& directory = top_->Directory();
   directory.SetString(header.c_str());
   top_->Supply(entries);
+  // Measuring and writing both hand out every entry.
+  Progress progress("writing the package", 2 * entries.size());
+  top_->progress = &progress;
+  top_->handled = 0;
   const int size = directory.WriteToBuffer(nullptr, 0, !crlf, false);
-  if (size <= 0 || size == INT_MAX) throw InputError("the package is too large to be written");
+  if (size <= 0 || size == INT_MAX) {
+    top_->progress = nullptr;
+    throw InputError("the package is too large to be written");
+  }
   std::string buffer(static_cast<std::size_t>(size), '\0');
-  if (directory.WriteToBuffer(buffer.data(), size, !crlf, scramble) != size) {
+  const bool whole = directory.WriteToBuffer(buffer.data(), size, !crlf, scramble) == size;
+  top_->progress = nullptr;
+  if (!whole) {
     throw std::logic_error("the package changed size between measuring and writing");
   }
   buffer.pop_back();  // the NUL, scrambled or not
@@ -180,11 +194,16 @@ std::string ChannelTree::Write(const std::string& header, const std::vector<Entr
 }
 
 std::vector<Entry> ChannelTree::Read(std::string& text, bool crlf,
-                                     const std::function<void(Entry&&)>& sink) {
+                                     const std::function<void(Entry&&)>& sink,
+                                     std::size_t expected) {
   if (text.size() >= INT_MAX) throw InputError("the package is too large to be read");
   top_->Collect();
   top_->sink = sink;
+  Progress progress("reading the package", expected);
+  top_->progress = &progress;
+  top_->handled = 0;
   top_->Directory().ReadFromBuffer(text.data(), static_cast<int>(text.size() + 1), !crlf, false);
+  top_->progress = nullptr;
   return std::move(top_->collected);
 }
 

@@ -31,8 +31,10 @@ class ChannelTree {
   // looks, and the string's own terminating NUL ends it.
   // With a sink, each entry of the top directory goes there once read instead, and nothing is
   // returned: the entries need never be held all at once.
+  // `expected`, the number of entries the text holds, measures the progress shown.
   std::vector<Entry> Read(std::string& text, bool crlf,
-                          const std::function<void(Entry&&)>& sink = nullptr);
+                          const std::function<void(Entry&&)>& sink = nullptr,
+                          std::size_t expected = 0);
 
  private:
   struct Node;

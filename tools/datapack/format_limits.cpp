@@ -95,7 +95,8 @@ class Checker {
   void Report(const Place& place, const std::optional<std::string>& problem) {
     // A NUL ends the channel's text: nothing could write what follows it.
     if (problem) {
-      problems.push_back({place.pointer, place.path + ": " + *problem, *problem != kNulProblem});
+      problems.push_back(
+          {place.Pointer(), ShownPath(place.Path()) + ": " + *problem, *problem != kNulProblem});
     }
   }
 
@@ -176,7 +177,7 @@ std::string EntryCountProblem(std::size_t count) {
 
 std::vector<Problem> CheckLimits(const Package& package) {
   Checker checker;
-  const Place root{"", ""};
+  const Place root;
   checker.Report(root.Key(kHeaderKey).Named("header"),
                  HeaderProblem(package.header, package.top.name));
   const Place top = root.Key(kDirectoryKey);

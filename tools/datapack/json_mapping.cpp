@@ -265,7 +265,7 @@ class FromJson {
   explicit FromJson(bool latin1 = false) : latin1_(latin1) {}
 
   Package Read(const Json& root) {
-    const Place place{"", ""};
+    const Place place;
     Expect(root, place, Json::value_t::object, "an object");
     Keys(root, place, {kHeaderKey, kLineBreaksKey, kEncodingKey, kScrambledKey, kDirectoryKey});
     if (const Json* encoding = Find(root, place, kEncodingKey)) {
@@ -303,7 +303,8 @@ class FromJson {
 
  private:
   [[noreturn]] static void Fail(const Place& place, const std::string& message) {
-    throw JsonError(place.pointer, place.path.empty() ? message : place.path + ": " + message);
+    const std::string path = place.Path();
+    throw JsonError(place.Pointer(), path.empty() ? message : ShownPath(path) + ": " + message);
   }
 
   static void Expect(const Json& json, const Place& place, Json::value_t type, const char* what) {
@@ -558,7 +559,7 @@ class StreamedReader {
 
   std::vector<Frame> frames_;
   Json parts_ = Json::object();
-  const Place top_ = Place{"", ""}.Key(kDirectoryKey);
+  const Place top_ = Place().Key(kDirectoryKey);
   std::optional<datapack::Shape> shape_;
   std::vector<Entry> entries_;
   bool latin1_ = false;
@@ -581,6 +582,38 @@ std::string ShownName(std::string_view name) {
   }
   if (name.size() > kShown) shown += "...";
   return shown;
+}
+
+std::vector<const Place::Link*> Place::Links() const {
+  std::vector<const Link*> links;
+  for (const Link* link = last_.get(); link; link = link->before.get())
+    links.push_back(link);
+  std::reverse(links.begin(), links.end());
+  return links;
+}
+
+std::string Place::Pointer() const {
+  std::string pointer;
+  for (const Link* link : Links()) {
+    if (link->kind != kNamed) pointer += "/" + link->text;
+  }
+  return pointer;
+}
+
+std::string Place::Path() const {
+  std::string path;
+  for (const Link* link : Links()) {
+    if (link->kind == kEntry) path += "[" + link->text + "]";
+    if (link->kind == kNamed) path += (path.empty() ? "" : ".") + ShownName(link->text);
+  }
+  return path;
+}
+
+std::string ShownPath(const std::string& path) {
+  constexpr std::size_t kEnds = 60;
+  if (path.size() <= 3 * kEnds) return path;
+  return path.substr(0, kEnds) + " ... " + path.substr(path.size() - kEnds) + " (" +
+         std::to_string(std::count(path.begin(), path.end(), '.') + 1) + " names)";
 }
 
 std::size_t JsonError::OffsetIn(std::string_view text) const {

@@ -12,10 +12,12 @@
 #pragma once
 
 #include <cstddef>
+#include <memory>
 #include <optional>
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "tools/datapack/file_io.h"
 #include "tools/datapack/package_model.h"
@@ -25,22 +27,41 @@ namespace datapack {
 // A name as messages show it: its first 40 bytes, control bytes as \xNN.
 std::string ShownName(std::string_view name);
 
-// Where a part of a package stands in its JSON form, and how a message names it.
-struct Place {
-  std::string pointer;  // JSON pointer
-  std::string path;     // "Players[3].Items", a name in brackets for entries
+// A path as messages show it: a deep one keeps its start and its end.
+std::string ShownPath(const std::string& path);
 
-  Place Key(std::string_view key) const { return {pointer + "/" + std::string(key), path}; }
+// Where a part of a package stands in its JSON form, and how a message names it. Places are made
+// for every value read; their texts only for messages, so that a deep one costs no more than a
+// shallow one.
+class Place {
+ public:
+  Place() = default;
+
+  Place Key(std::string_view key) const { return Step(kKey, std::string(key)); }
   Place Item(std::size_t index) const { return Key(std::to_string(index)); }
   // An entry of the directory the path names.
-  Place Entry(std::size_t index) const {
-    return {pointer + "/" + std::to_string(index), path + "[" + std::to_string(index) + "]"};
-  }
+  Place Entry(std::size_t index) const { return Step(kEntry, std::to_string(index)); }
   // Long names are cut short in messages, and bytes a terminal would not show are escaped.
-  Place Named(std::string_view name) const {
-    const std::string shown = ShownName(name);
-    return {pointer, path.empty() ? shown : path + "." + shown};
+  Place Named(std::string_view name) const { return Step(kNamed, std::string(name)); }
+
+  std::string Pointer() const;  // JSON pointer
+  std::string Path() const;     // "Players[3].Items", a name in brackets for entries
+
+ private:
+  enum Kind { kKey, kEntry, kNamed };
+  struct Link {
+    std::shared_ptr<const Link> before;
+    Kind kind;
+    std::string text;
+  };
+  Place Step(Kind kind, std::string text) const {
+    Place next;
+    next.last_ = std::make_shared<const Link>(Link{last_, kind, std::move(text)});
+    return next;
   }
+  std::vector<const Link*> Links() const;
+
+  std::shared_ptr<const Link> last_;
 };
 
 inline constexpr std::string_view kHeaderKey = "header";

@@ -13,9 +13,10 @@ void FindShortfalls(const FoundDirectory& found, const Shape& shape,
                     const std::vector<Entry>& entries, const Place& place,
                     std::vector<Shortfall>& out) {
   if (found.entries.size() != entries.size()) {
-    out.push_back({found.offset,
-                   "the text holds " + Counted(found.entries.size(), "entry", "entries") + " of " +
-                       place.path + ", the reader takes " + std::to_string(entries.size())});
+    out.push_back({found.offset, "the text holds " +
+                                     Counted(found.entries.size(), "entry", "entries") + " of " +
+                                     ShownPath(place.Path()) + ", the reader takes " +
+                                     std::to_string(entries.size())});
   }
   for (std::size_t i = 0; i < std::min(found.entries.size(), entries.size()); ++i) {
     for (std::size_t k = 0; k < shape.directories.size(); ++k) {
@@ -62,7 +63,7 @@ bool SameWritten(const Value& meant, const Value& read) {
 }
 
 Problem Report(const Place& place, const std::string& message) {
-  return Problem{place.pointer, place.path + ": " + message};
+  return Problem{place.Pointer(), ShownPath(place.Path()) + ": " + message};
 }
 
 std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& meantEntries,
@@ -128,7 +129,8 @@ ReadResult ReadPackage(const Plugins& plugins, std::string& text, const EntrySin
   ReadResult result;
   std::function<void(Entry &&)> each;
   if (sink) each = [&](Entry&& entry) { sink(structure.top, std::move(entry)); };
-  result.package.entries = ChannelTree(plugins, structure.top).Read(text, structure.crlf, each);
+  result.package.entries = ChannelTree(plugins, structure.top)
+                               .Read(text, structure.crlf, each, structure.found.entries.size());
   result.package.header = std::move(structure.header);
   result.package.crlf = structure.crlf;
   result.notes = std::move(structure.notes);
@@ -140,18 +142,18 @@ ReadResult ReadPackage(const Plugins& plugins, std::string& text, const EntrySin
 std::vector<Shortfall> FindShortfalls(const ReadResult& result) {
   std::vector<Shortfall> shortfalls;
   FindShortfalls(result.found, result.package.top, result.package.entries,
-                 Place{"", ""}.Named(result.package.top.name), shortfalls);
+                 Place().Named(result.package.top.name), shortfalls);
   return shortfalls;
 }
 
 std::optional<Problem> CheckReadBack(const Plugins& plugins, const Package& package,
                                      std::string& written) {
-  const Place top = Place{"", ""}.Key(kDirectoryKey).Named(package.top.name);
+  const Place top = Place().Key(kDirectoryKey).Named(package.top.name);
   Structure structure;
   try {
     structure = FindStructure(written);
   } catch (const StructureError& error) {
-    return Problem{top.pointer,
+    return Problem{top.Pointer(),
                    "the package written from it does not read back: " + std::string(error.what())};
   }
   if (structure.header != package.header) {

@@ -202,7 +202,7 @@ class Parser {
   }
 
   void Notice(std::size_t offset, bool warning, const std::optional<std::string>& problem) {
-    if (problem) notes_.push_back({offset, warning, path_ + ": " + *problem});
+    if (problem) notes_.push_back({offset, warning, ShownPath(path_) + ": " + *problem});
   }
 
   // A data element's value runs to the first "</", as the reader takes it.
