@@ -75,6 +75,8 @@ Function SymbolAs(void* module, const char* name) {
 
 std::string ChannelLibraryFileName(const GUID& type) { return GuidToString(type) + kLibrarySuffix; }
 
+void* ChannelLibrary::Symbol(const char* name) const { return FindSymbol(module_, name); }
+
 std::string ExecutableFolder() {
 #if defined(_WIN32)
   // A path that fills the buffer may have been cut short: try again with a larger one.

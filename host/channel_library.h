@@ -42,6 +42,9 @@ class TESSEL_API ChannelLibrary : public std::enable_shared_from_this<ChannelLib
   GetTypeFunction GetTypeEntry() const { return getType_; }
   InitDllFunction InitDllEntry() const { return initDll_; }
 
+  // Another export of the library, by its exported name; null when it has none.
+  void* Symbol(const char* name) const;
+
   // The library's type record, as its GetType reports it.
   const ChannelType& Type() const { return *getType_(); }
 

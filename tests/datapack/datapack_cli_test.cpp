@@ -12,11 +12,6 @@ namespace {
 
 namespace fs = std::filesystem;
 
-constexpr char kPlayersPackage[] =
-    "\n<Players id=\"0\">\n\t<Name Type=\"Txt\"> Ann </Name>\n\t<Score Type=\"Val\"> 12.5 </Score>"
-    "\n</Players>\n<Players id=\"1\">\n\t<Name Type=\"Txt\"> Bob </Name>"
-    "\n\t<Score Type=\"Val\"> 7 </Score>\n</Players>";
-
 constexpr char kPlayersJson[] = R"({
   "header": "",
   "lineBreaks": "LF",

@@ -20,3 +20,9 @@ std::filesystem::path ScratchFolder();
 
 std::string ReadBytes(const std::filesystem::path& path);
 void WriteBytes(const std::filesystem::path& path, const std::string& bytes);
+
+// The Players package of the demo, as stored.
+inline constexpr char kPlayersPackage[] =
+    "\n<Players id=\"0\">\n\t<Name Type=\"Txt\"> Ann </Name>\n\t<Score Type=\"Val\"> 12.5 </Score>"
+    "\n</Players>\n<Players id=\"1\">\n\t<Name Type=\"Txt\"> Bob </Name>"
+    "\n\t<Score Type=\"Val\"> 7 </Score>\n</Players>";

@@ -165,7 +165,7 @@ struct ChannelTree::Node {
 };
 
 ChannelTree::ChannelTree(const Plugins& plugins, const Shape& top)
-    : top_(std::make_unique<Node>(plugins, top)) {}
+    : plugins_(plugins), top_(std::make_unique<Node>(plugins, top)) {}
 
 ChannelTree::~ChannelTree() = default;
 
@@ -178,13 +178,14 @@ std::string ChannelTree::Write(const std::string& header, const std::vector<Entr
   Progress progress("writing the package", 2 * entries.size());
   top_->progress = &progress;
   top_->handled = 0;
-  const int size = directory.WriteToBuffer(nullptr, 0, !crlf, false);
+  const int size = plugins_.WriteToBuffer(directory, nullptr, 0, !crlf, false);
   if (size <= 0 || size == INT_MAX) {
     top_->progress = nullptr;
     throw InputError("the package is too large to be written");
   }
   std::string buffer(static_cast<std::size_t>(size), '\0');
-  const bool whole = directory.WriteToBuffer(buffer.data(), size, !crlf, scramble) == size;
+  const bool whole =
+      plugins_.WriteToBuffer(directory, buffer.data(), size, !crlf, scramble) == size;
   top_->progress = nullptr;
   if (!whole) {
     throw std::logic_error("the package changed size between measuring and writing");
@@ -202,7 +203,8 @@ std::vector<Entry> ChannelTree::Read(std::string& text, bool crlf,
   Progress progress("reading the package", expected);
   top_->progress = &progress;
   top_->handled = 0;
-  top_->Directory().ReadFromBuffer(text.data(), static_cast<int>(text.size() + 1), !crlf, false);
+  plugins_.ReadFromBuffer(top_->Directory(), text.data(), static_cast<int>(text.size() + 1), !crlf,
+                          false);
   top_->progress = nullptr;
   return std::move(top_->collected);
 }

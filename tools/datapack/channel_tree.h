@@ -38,6 +38,7 @@ class ChannelTree {
 
  private:
   struct Node;
+  Plugins plugins_;
   std::unique_ptr<Node> top_;
 };
 

@@ -72,11 +72,12 @@ Loaded Load(const std::string& file, Scrambling scrambling, const Plugins& plugi
   Loaded loaded;
   loaded.name = StreamName(file, true);
   loaded.text = ReadInput(file);
-  const bool scrambled = scrambling == Scrambling::kScrambled ||
-                         (scrambling == Scrambling::kDetect && LooksScrambled(loaded.text));
+  const bool scrambled =
+      scrambling == Scrambling::kScrambled ||
+      (scrambling == Scrambling::kDetect && LooksScrambled(loaded.text, plugins));
   if (scrambled) {
     CheckScramblable(loaded.text, loaded.name);
-    Lum_DataPackage::Decrypt(loaded.text.data(), static_cast<int>(loaded.text.size()));
+    plugins.Decrypt(loaded.text.data(), static_cast<int>(loaded.text.size()));
   }
   const std::size_t nul = loaded.text.find('\0');
   if (nul != std::string::npos) {
@@ -221,7 +222,7 @@ bool EndsWithTag(std::string_view text) {
 
 }  // namespace
 
-bool LooksScrambled(std::string_view bytes) {
+bool LooksScrambled(std::string_view bytes, const Plugins& plugins) {
   // Plain packages are text; scrambling shifts byte i by an amount that runs through every value
   // from i = 12 on, so that about one byte in eight of a scrambled text lands among the control
   // bytes. The first 268 bytes see every amount.
@@ -234,13 +235,13 @@ bool LooksScrambled(std::string_view bytes) {
     });
   };
   const auto asItStands = controls(start);
-  Lum_DataPackage::Decrypt(start.data(), static_cast<int>(start.size()));
+  plugins.Decrypt(start.data(), static_cast<int>(start.size()));
   const auto unscrambled = controls(start);
   if (asItStands != unscrambled || bytes.size() > kLooked) return unscrambled < asItStands;
   // A short package may look like text both ways: then only one way ends with a tag, but for one
   // chance in a few hundred.
   std::string whole(bytes);
-  Lum_DataPackage::Decrypt(whole.data(), static_cast<int>(whole.size()));
+  plugins.Decrypt(whole.data(), static_cast<int>(whole.size()));
   return EndsWithTag(whole) && !EndsWithTag(bytes);
 }
 
@@ -250,14 +251,15 @@ void Demo(const DemoOptions& options) {
 }
 
 void Scramble(const ScrambleOptions& options) {
+  const Plugins plugins = LoadPlugins(pluginDir);
   const auto scrambled = [&] {
     std::string bytes = ReadInput(options.input);
     CheckScramblable(bytes, StreamName(options.input, true));
     const int length = static_cast<int>(bytes.size());
     if (options.undo) {
-      Lum_DataPackage::Decrypt(bytes.data(), length);
+      plugins.Decrypt(bytes.data(), length);
     } else {
-      Lum_DataPackage::Encrypt(bytes.data(), length);
+      plugins.Encrypt(bytes.data(), length);
     }
     return bytes;
   };
@@ -348,7 +350,7 @@ void Pack(const PackOptions& options) {
     // The amount each byte is shifted by depends only on its place: the NUL the plug-in
     // scrambles last changes nothing before it.
     CheckScramblable(bytes, name);
-    Lum_DataPackage::Encrypt(bytes.data(), static_cast<int>(bytes.size()));
+    plugins.Encrypt(bytes.data(), static_cast<int>(bytes.size()));
   }
   WriteOutput(options.output, bytes, options.file);
 }

@@ -2,6 +2,9 @@
 #pragma once
 
 #include <string>
+#include <string_view>
+
+#include "tools/datapack/plugins.h"
 
 namespace datapack {
 
@@ -57,6 +60,6 @@ int Check(const CheckOptions& options);
 int Diff(const DiffOptions& options);
 
 // The rule that tells a scrambled package from a plain one, by its first bytes.
-bool LooksScrambled(std::string_view bytes);
+bool LooksScrambled(std::string_view bytes, const Plugins& plugins);
 
 }  // namespace datapack

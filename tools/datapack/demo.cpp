@@ -104,21 +104,21 @@ std::string RunDemo(const Plugins& plugins) {
   const std::vector<PlayerEntry> players = {{"Ann", 12.5f}, {"Bob", 7.0f}};
   PlayersTree writer(directories, texts);
   writer.Supply(players);
-  const int size = writer.Directory().WriteToBuffer(nullptr, 0, true, false);
+  const int size = plugins.WriteToBuffer(writer.Directory(), nullptr, 0, true, false);
   std::vector<char> package(static_cast<std::size_t>(size));
-  writer.Directory().WriteToBuffer(package.data(), size, true, false);
+  plugins.WriteToBuffer(writer.Directory(), package.data(), size, true, false);
   std::printf("Package     %d bytes with its NUL, LF line breaks, empty header:\n", size);
   PrintText(package.data());
   std::string plain(package.data());
 
-  writer.Directory().WriteToBuffer(package.data(), size, true, true);
+  plugins.WriteToBuffer(writer.Directory(), package.data(), size, true, true);
   std::printf("\nScrambled   the same %d bytes, the first 24:\n", size);
   PrintBytes(package, 24);
 
   std::vector<PlayerEntry> received;
   PlayersTree reader(directories, texts);
   reader.Collect(received);
-  const int advanced = reader.Directory().ReadFromBuffer(package.data(), size, true, true);
+  const int advanced = plugins.ReadFromBuffer(reader.Directory(), package.data(), size, true, true);
   std::printf("\nRead back   %d bytes unscrambled and read, Count now %g\n", advanced,
               static_cast<double>(reader.Count()));
   std::printf("  %-6s %-8s %s\n", "entry", "Name", "Score");

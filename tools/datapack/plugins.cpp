@@ -1,6 +1,9 @@
 #include "tools/datapack/plugins.h"
 
 #include <filesystem>
+#include <type_traits>
+
+#include "plugin/data_package.h"
 
 #include "tools/datapack/input_error.h"
 
@@ -39,7 +42,35 @@ std::vector<std::string> PluginFolders(const std::string& pluginDir) {
 
 Plugins LoadPlugins(const std::string& pluginDir) {
   const std::vector<std::string> folders = PluginFolders(pluginDir);
-  return {Open(folders, kDataDirectoryGuid), Open(folders, kStringChannelGuid)};
+  Plugins plugins{Open(folders, kDataDirectoryGuid), Open(folders, kStringChannelGuid)};
+#if defined(_WIN32)
+  // Windows finds the DLLs the program links beside it, and calls members its own way.
+  plugins.write = [](Lum_DataPackage* directory, char* buffer, int size, bool newline,
+                     bool scramble) {
+    return directory->WriteToBuffer(buffer, size, newline, scramble);
+  };
+  plugins.read = [](Lum_DataPackage* directory, char* buffer, int size, bool newline,
+                    bool unscramble) {
+    return directory->ReadFromBuffer(buffer, size, newline, unscramble);
+  };
+  plugins.encrypt = &Lum_DataPackage::Encrypt;
+  plugins.decrypt = &Lum_DataPackage::Decrypt;
+#else
+  // A member function takes its object as a first argument in this ABI.
+  const auto find = [&](auto& entry, const char* name) {
+    void* symbol = plugins.directories->Symbol(name);
+    if (!symbol) {
+      throw InputError("channel plug-in " + plugins.directories->Path() + " does not export " +
+                       name);
+    }
+    entry = reinterpret_cast<std::remove_reference_t<decltype(entry)> >(symbol);
+  };
+  find(plugins.write, "_ZN15Lum_DataPackage13WriteToBufferEPcibb");
+  find(plugins.read, "_ZN15Lum_DataPackage14ReadFromBufferEPcibb");
+  find(plugins.encrypt, "_ZN15Lum_DataPackage7EncryptEPci");
+  find(plugins.decrypt, "_ZN15Lum_DataPackage7DecryptEPci");
+#endif
+  return plugins;
 }
 
 }  // namespace datapack

@@ -8,11 +8,31 @@
 
 #include "host/channel_library.h"
 
+class Lum_DataPackage;
+
 namespace datapack {
 
+// The plug-ins, and the package codec's entry points in the one that was loaded: the program does
+// not link the plug-ins, so that it starts wherever they are and finds them where it is told.
 struct Plugins {
   std::shared_ptr<ChannelLibrary> directories;
   std::shared_ptr<ChannelLibrary> texts;
+
+  int WriteToBuffer(Lum_DataPackage& directory, char* buffer, int size, bool newlineChoice,
+                    bool scramble) const {
+    return write(&directory, buffer, size, newlineChoice, scramble);
+  }
+  int ReadFromBuffer(Lum_DataPackage& directory, char* buffer, int size, bool newlineChoice,
+                     bool unscramble) const {
+    return read(&directory, buffer, size, newlineChoice, unscramble);
+  }
+  void Encrypt(char* data, int length) const { encrypt(data, length); }
+  void Decrypt(char* data, int length) const { decrypt(data, length); }
+
+  int (*write)(Lum_DataPackage*, char*, int, bool, bool) = nullptr;
+  int (*read)(Lum_DataPackage*, char*, int, bool, bool) = nullptr;
+  void (*encrypt)(char*, int) = nullptr;
+  void (*decrypt)(char*, int) = nullptr;
 };
 
 // Where plug-ins are looked for, in order: beside the program's real path, the install layout's
