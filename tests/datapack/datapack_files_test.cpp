@@ -24,6 +24,8 @@ namespace {
 
 namespace fs = std::filesystem;
 
+#if !defined(_WIN32)
+
 std::vector<std::string> Names(const fs::path& folder) {
   std::vector<std::string> names;
   for (const auto& entry : fs::directory_iterator(folder))
@@ -31,8 +33,6 @@ std::vector<std::string> Names(const fs::path& folder) {
   std::sort(names.begin(), names.end());
   return names;
 }
-
-#if !defined(_WIN32)
 
 fs::path Program() { return fs::path(ExecutableFolder()) / "datapack"; }
 
