@@ -139,9 +139,8 @@ int main(int argc, char** argv) {
     return kBadUsage;
   }
 
-  // diff and check keep 1 for what they find: trouble is 2 there.
-  const bool findings = *checkCommand || *diffCommand;
-  const int trouble = *diffCommand ? kBadUsage : kBadInput;
+  // check and diff keep 1 for what they find: trouble is 2 there.
+  const int trouble = *checkCommand || *diffCommand ? kBadUsage : kBadInput;
   int status = 0;
   try {
     if (*demo) datapack::Demo(demoOptions);
@@ -153,15 +152,15 @@ int main(int argc, char** argv) {
     if (*diffCommand) status = datapack::Diff(diff);
   } catch (const datapack::InputError& error) {
     PrintError(error.what());
-    return findings ? (*checkCommand ? kBadUsage : trouble) : kBadInput;
+    return trouble;
   } catch (const std::bad_alloc&) {
     PrintError("out of memory");
-    return findings ? kBadUsage : kBadInput;
+    return trouble;
   }
   // What went to standard output through stdio (the demo) must have arrived too.
   if (std::fflush(stdout) != 0 || std::ferror(stdout)) {
     PrintError(std::string("cannot write standard output: ") + std::strerror(errno));
-    return findings ? kBadUsage : kBadInput;
+    return trouble;
   }
   return status;
 }
