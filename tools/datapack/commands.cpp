@@ -4,6 +4,7 @@
 #include <climits>
 #include <cstdio>
 #include <filesystem>
+#include <fstream>
 #include <optional>
 #include <string_view>
 
@@ -61,6 +62,7 @@ class NotAPackage : public InputError {
 
 // A stored package as the engine's reader receives it.
 struct Loaded {
+  std::string file;
   std::string name;
   std::string text;          // unscrambled, cut at the first NUL
   std::size_t afterNul = 0;  // the bytes past that NUL, which no reader sees
@@ -70,6 +72,7 @@ struct Loaded {
 Loaded Load(const std::string& file, Scrambling scrambling, const Plugins& plugins,
             const EntrySink& sink = nullptr) {
   Loaded loaded;
+  loaded.file = file;
   loaded.name = StreamName(file, true);
   loaded.text = ReadInput(file);
   const bool scrambled =
@@ -105,7 +108,53 @@ struct Finding {
   std::string message;
 };
 
-std::vector<Finding> Findings(const Loaded& loaded, const Plugins& plugins) {
+// Where writing again what the reader took first differs from the text. A file is read again for
+// the comparison rather than held beside the package written again; the text comes back only when
+// they differ, to place the finding.
+std::optional<std::size_t> WrittenAgainDiffers(Loaded& loaded, const Plugins& plugins) {
+  const std::size_t size = loaded.text.size();
+  const bool reread = !IsStandardStream(loaded.file);
+  if (reread) std::string().swap(loaded.text);
+  std::string again = WritePackage(plugins, loaded.result.package, false);
+  if (!reread) {
+    const auto differs =
+        std::mismatch(again.begin(), again.end(), loaded.text.begin(), loaded.text.end());
+    if (differs.first == again.end() && differs.second == loaded.text.end()) return std::nullopt;
+    return static_cast<std::size_t>(differs.second - loaded.text.begin());
+  }
+  // The file as it stands: scrambled, the bytes written again are scrambled to match.
+  if (loaded.result.package.scrambled) {
+    plugins.Encrypt(again.data(), static_cast<int>(again.size()));
+  }
+  std::optional<std::size_t> at;
+  std::ifstream file(loaded.file, std::ios::binary);
+  std::vector<char> chunk(1 << 16);
+  std::size_t done = 0;
+  while (!at && done < size) {
+    file.read(chunk.data(), static_cast<std::streamsize>(std::min(chunk.size(), size - done)));
+    const auto read = static_cast<std::size_t>(file.gcount());
+    if (read == 0) {
+      at = done;
+      break;
+    }
+    for (std::size_t i = 0; i < read && !at; ++i) {
+      if (done + i >= again.size() || again[done + i] != chunk[i]) at = done + i;
+    }
+    done += read;
+  }
+  if (!at && again.size() != size) at = std::min(again.size(), size);
+  if (at) {
+    std::string().swap(again);
+    loaded.text = ReadInput(loaded.file);
+    if (loaded.result.package.scrambled) {
+      plugins.Decrypt(loaded.text.data(), static_cast<int>(loaded.text.size()));
+    }
+    loaded.text.resize(std::min(loaded.text.size(), size));
+  }
+  return at;
+}
+
+std::vector<Finding> Findings(Loaded& loaded, const Plugins& plugins) {
   std::vector<Finding> findings;
   for (const Note& note : loaded.result.notes)
     findings.push_back({note.offset, note.warning, note.message});
@@ -118,12 +167,8 @@ std::vector<Finding> Findings(const Loaded& loaded, const Plugins& plugins) {
          Counted(loaded.afterNul, "byte", "bytes") + " after a NUL byte, where the reader stops"});
   }
   if (findings.empty()) {
-    const std::string again = WritePackage(plugins, loaded.result.package, false);
-    if (again != text) {
-      const std::size_t at = static_cast<std::size_t>(
-          std::mismatch(again.begin(), again.end(), text.begin(), text.end()).second -
-          text.begin());
-      findings.push_back({at, true,
+    if (const auto at = WrittenAgainDiffers(loaded, plugins)) {
+      findings.push_back({*at, true,
                           "written again, the package differs from here on (numbers written "
                           "otherwise, or spacing)"});
     }
@@ -287,7 +332,8 @@ void Show(const ShowOptions& options) {
                  places.At(loaded.text.size()).c_str(),
                  Counted(loaded.afterNul, "byte", "bytes").c_str());
   }
-  loaded.text = std::string();  // the package is printed from what was read
+  // The package is printed from what was read. (Assigning an empty string would keep the room.)
+  std::string().swap(loaded.text);
   Output out("");
   if (options.json) {
     WritePackageJson(loaded.result.package, out);
@@ -337,7 +383,7 @@ void Pack(const PackOptions& options) {
   std::erase_if(problems, [](const Problem& problem) { return problem.forceable; });
   if (!problems.empty()) refuse(problems, false);
   // A file can be read again for a message; the package needs the room meanwhile.
-  if (!IsStandardStream(options.file)) text = std::string();
+  if (!IsStandardStream(options.file)) std::string().swap(text);
 
   const Plugins plugins = LoadPlugins(pluginDir);
   std::string bytes = WritePackage(plugins, package, false);
@@ -367,10 +413,11 @@ int Check(const CheckOptions& options) {
     out.Commit();
     return 1;
   }
+  const std::vector<Finding> findings = Findings(loaded, plugins);
   Places places(loaded.name, loaded.text);
   Output out("");
   bool failed = false;
-  for (const Finding& finding : Findings(loaded, plugins)) {
+  for (const Finding& finding : findings) {
     failed = failed || !finding.warning || options.strict;
     out << places.At(finding.offset) << (finding.warning ? "warning: " : "error: ")
         << finding.message << "\n";
@@ -382,7 +429,7 @@ int Check(const CheckOptions& options) {
 int Diff(const DiffOptions& options) {
   const Plugins plugins = LoadPlugins(pluginDir);
   Loaded before = Load(options.before, options.scrambling, plugins);
-  before.text = std::string();
+  std::string().swap(before.text);
   const Package& a = before.result.package;
   const std::string path = ShownName(a.top.name);
   Output out("");
