@@ -6,7 +6,9 @@ sizes and on nested packages of several depths. Run by hand, not in CI:
                             [--depths 10,100,1023] [--depth-size 2] [--work DIR]
 
 Each package is made by `datapack pack` from a generated JSON. Times are wall-clock seconds of
-the best of --repeat runs; memory is the peak resident set that /usr/bin/time reports.
+the best of --repeat runs; memory is the peak resident set that /usr/bin/time reports, and, in the
+last column, that peak less the program's own (its peak showing the demo package), per byte of
+package.
 """
 
 import argparse
@@ -131,13 +133,17 @@ def main():
              for s in options.sizes.split(",")]
     cases += [("nested depth %s" % d, "nested%s" % d, nested(int(d), int(options.depth_size * MB)))
               for d in options.depths.split(",")]
-    print("%-22s %-12s %10s %9s %12s %9s %7s" %
-          ("package", "command", "bytes", "seconds", "ns/byte", "peak MB", "peak/size"))
+    demo = os.path.join(work, "demo.pkg")
+    run([datapack, "demo", "-o", demo])
+    base = run([datapack, "show", demo])[1]
+    print("%-22s %-12s %10s %9s %12s %9s %9s %9s" % ("package", "command", "bytes", "seconds",
+                                                     "ns/byte", "peak MB", "peak/size", "above/size"))
     for title, name, description in cases:
         size, rows = measure(datapack, work, name, description, options.repeat, commands)
         for label, seconds, peak in rows:
-            print("%-22s %-12s %10d %9.2f %12.1f %9.1f %7.2f" %
-                  (title, label, size, seconds, seconds * 1e9 / size, peak / MB, peak / size))
+            print("%-22s %-12s %10d %9.2f %12.1f %9.1f %9.2f %9.2f" %
+                  (title, label, size, seconds, seconds * 1e9 / size, peak / MB, peak / size,
+                   (peak - base) / size))
             sys.stdout.flush()
         description.clear()
 
