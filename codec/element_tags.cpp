@@ -1,9 +1,11 @@
 // The tags of a directory entry and the typed data elements, each serving both directions: one
 // walk writes them and reads them back with the same calls.
+#include <algorithm>
 #include <cstring>
 
 #include "codec/number_format.h"
 #include "codec/number_scan.h"
+#include "codec/pattern_search.h"
 #include "plugin/data_package.h"
 
 namespace {
@@ -23,6 +25,24 @@ std::string_view FormatFloats(const float* values, int count, char* out) {
     end += numbers::FormatFloat(values[i], end);
   }
   return std::string_view(out, static_cast<std::size_t>(end - out));
+}
+
+// Reading, at `at` just after a typed element's opening tag: scans the numbers of `format` into
+// `values` and returns where the search for the ">" that ends the element may start. What the
+// scan matched holds no ">", so that is past it.
+const char* ScanNumbers(const char* at, const char* textEnd, std::string_view format,
+                        float* values) {
+  const char* end = at;
+  numbers::ScanFloats(at, textEnd, format, values, &end);
+  return end;
+}
+
+// The ">" of a tag when it stands within a few bytes of `from`, or null: then the reader's own
+// search, which remembers what it found, takes over.
+const char* NearbyClose(const char* from, const char* textEnd) {
+  constexpr std::ptrdiff_t kNearby = 32;
+  const char* const end = textEnd - from > kNearby ? from + kNearby : textEnd;
+  return pattern_search::Find(from, end, textEnd, ">");
 }
 
 }  // namespace
@@ -90,25 +110,46 @@ void Lum_DataPackage::WriteTypedElement(std::string_view name, std::string_view 
 // after its opening tag; otherwise puts the cursor back and reports false.
 // A name that trimmed text can equal, and in which no "Type=" cuts the text short.
 bool Lum_DataPackage::IsPlainName(std::string_view name) {
-  return !name.empty() && name.size() < kTextLength && !IsWhiteSpace(name.front()) &&
-         !IsWhiteSpace(name.back()) && name.find("Type=") == std::string_view::npos;
+  if (name.empty() || name.size() >= kTextLength || pattern_search::IsWhiteSpace(name.front()) ||
+      pattern_search::IsWhiteSpace(name.back())) {
+    return false;
+  }
+  // Names are short: a byte at a time beats a call.
+  for (std::size_t i = 0; i + 5 <= name.size(); ++i) {
+    if (name[i] == 'T' && pattern_search::SameBytes(name.data() + i, "Type=", 5)) return false;
+  }
+  return true;
 }
 
 bool Lum_DataPackage::ReadTypedElementName(const char* name) {
   const int start = bufferCursor;
   const std::size_t length = std::strlen(name);
-  const char* const open = Find("<");
+  // Elements follow one another with only whitespace between them: a "<" after whitespace is
+  // the first one ahead.
+  const char* open = pattern_search::SkipWhiteSpace(bufferStart + start, textEnd);
+  if (open == textEnd || *open != '<') open = Find("<");
   if (open && IsPlainName(std::string_view(name, length))) {
     // The trimmed text between "<" and the first "Type=" equals such a name exactly when the name
     // stands right after the "<" and whitespace, followed by whitespace and "Type=": "Type=" can
     // neither start inside the name nor straddle its end. So it is compared where it stands.
-    const char* p = SkipWhiteSpace(open + 1);
+    const char* p = pattern_search::SkipWhiteSpace(open + 1, textEnd);
+    const char* const type =
+        pattern_search::SkipWhiteSpace(p + std::min(length, std::size_t(textEnd - p)), textEnd);
     const bool match = static_cast<std::size_t>(textEnd - p) >= length &&
-                       std::memcmp(p, name, length) == 0 &&
-                       std::string_view(SkipWhiteSpace(p + length), textEnd).starts_with("Type=");
-    bufferCursor = match ? static_cast<int>(p + length - bufferStart) : start;
-    if (match) MoveCursorAfter(">");
-    return match;
+                       pattern_search::SameBytes(p, name, length) &&
+                       std::string_view(type, textEnd).starts_with("Type=");
+    if (!match) {
+      bufferCursor = start;
+      return false;
+    }
+    // Neither the whitespace nor "Type=" holds the ">" that ends the tag.
+    if (const char* close = NearbyClose(type + 5, textEnd)) {
+      bufferCursor = static_cast<int>(close + 1 - bufferStart);
+    } else {
+      bufferCursor = static_cast<int>(p + length - bufferStart);
+      MoveCursorAfter(">");
+    }
+    return true;
   }
   MoveCursorAfter("<");
   CutStringBefore("Type=", tmp2);
@@ -133,8 +174,12 @@ void Lum_DataPackage::XML_ValueTag(const char* name, float& value) {
   if (write) {
     WriteTypedElement(name, "Val", FormatFloats(&value, 1, tmp2));
   } else if (ReadTypedElementName(name)) {
-    numbers::ScanFloat(bufferStart + bufferCursor, textEnd, value);
-    MoveCursorAfter(">");
+    if (const char* close =
+            NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, "%f", &value), textEnd)) {
+      bufferCursor = static_cast<int>(close + 1 - bufferStart);
+    } else {
+      MoveCursorAfter(">");
+    }
   } else {
     value = 0.0f;
   }
@@ -147,8 +192,12 @@ void Lum_DataPackage::XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
     return;
   }
   if (ReadTypedElementName(name)) {
-    numbers::ScanFloats(bufferStart + bufferCursor, textEnd, kVectorFormat, values);
-    MoveCursorAfter(">");
+    if (const char* close = NearbyClose(
+            ScanNumbers(bufferStart + bufferCursor, textEnd, kVectorFormat, values), textEnd)) {
+      bufferCursor = static_cast<int>(close + 1 - bufferStart);
+    } else {
+      MoveCursorAfter(">");
+    }
   } else {
     values[0] = values[1] = values[2] = 0.0f;
   }
@@ -163,8 +212,12 @@ void Lum_DataPackage::XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
     return;
   }
   if (ReadTypedElementName(name)) {
-    numbers::ScanFloats(bufferStart + bufferCursor, textEnd, kMatrixFormat, values);
-    MoveCursorAfter(">");
+    if (const char* close = NearbyClose(
+            ScanNumbers(bufferStart + bufferCursor, textEnd, kMatrixFormat, values), textEnd)) {
+      bufferCursor = static_cast<int>(close + 1 - bufferStart);
+    } else {
+      MoveCursorAfter(">");
+    }
   } else {
     std::memset(values, 0, sizeof(values));
   }

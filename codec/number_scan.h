@@ -14,7 +14,9 @@ const char* ScanFloat(const char* first, const char* last, float& value);
 // (again ending at the first NUL), for formats made only of "%f" directives, whitespace (matches
 // any amount of whitespace, including none) and other literal characters (must match exactly).
 // Returns how many values were stored (never EOF: 0 when none). Values after the first failure are
-// untouched. A '%' followed by anything but 'f' stops the scan there.
-int ScanFloats(const char* first, const char* last, std::string_view format, float* values);
+// untouched. A '%' followed by anything but 'f' stops the scan there. When `end` is given it
+// receives where the scan stopped: past everything the format matched.
+int ScanFloats(const char* first, const char* last, std::string_view format, float* values,
+               const char** end = nullptr);
 
 }  // namespace numbers

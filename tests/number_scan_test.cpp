@@ -242,6 +242,24 @@ TEST(ScanFloatsTest, Formats) {
   }
 }
 
+// Readers go on from where the scan stopped: past everything the format matched, and no further.
+TEST(ScanFloatsTest, StopsAfterWhatItMatched) {
+  const struct {
+    std::string_view text;
+    std::string_view format;
+    int stop;
+  } kCases[] = {
+      {" 1 2.5 -3 </Pos>", kVector, 9}, {"1 2 x", kVector, 4},  // the whitespace before x matched
+      {"1 2 3 4 5", kMatrix, 7},        {"1e+ </V>", "%f", 3}, {"x", "%f", 0}, {"", kVector, 0},
+  };
+  for (const auto& c : kCases) {
+    float values[16];
+    const char* stop = nullptr;
+    ScanFloats(c.text.data(), c.text.data() + c.text.size(), c.format, values, &stop);
+    EXPECT_EQ(stop - c.text.data(), c.stop) << Escape(c.text);
+  }
+}
+
 // Every prefix of awkward texts, each ending exactly at the end of its allocation.
 TEST(ScanFloatTest, ReadsNothingAtOrAfterLast) {
   const char* const kTexts[] = {
