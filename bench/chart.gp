@@ -4,10 +4,10 @@ set terminal svg size 1400,760 dynamic font "sans,11" background rgb "white"
 set output output
 set datafile missing "NaN"
 set logscale xy
-set xrange [0.7:80]
+set xrange [0.003:80]
 set yrange [*:*]
 set format y "%g"
-set xtics (1, 2, 4, 8, 16, 32, 50)
+set xtics ("4K" 0.004, "64K" 0.064, "1M" 1, "8M" 8, "50M" 50)
 set grid ytics xtics lc rgb "#dddddd"
 unset key
 set xlabel "package MB" offset 0,0.5
@@ -34,7 +34,7 @@ do for [block in "game-state@write nested@write text-heavy@write adversarial@wri
     unset key
     set border
     set tics
-    set xtics (1, 2, 4, 8, 16, 32, 50)
+    set xtics ("4K" 0.004, "64K" 0.064, "1M" 1, "8M" 8, "50M" 50)
     set grid ytics xtics lc rgb "#dddddd"
     set xlabel "package MB" offset 0,0.5
     set ylabel "MB/s" offset 1.5,0
