@@ -45,18 +45,37 @@ const char* NearbyClose(const char* from, const char* textEnd) {
   return pattern_search::Find(from, end, textEnd, ">");
 }
 
+// What TextBefore(">") and then MoveCursorAfter(">") give from `from` when the ">" stands a few
+// bytes ahead: the tag's content, trimmed, and where the cursor ends, just past the ">". Null
+// when it stands further, and the reader's own searches take over.
+const char* NearbyTagEnd(const char* from, const char* textEnd, std::string_view& content) {
+  const char* const close = NearbyClose(from, textEnd);
+  if (!close) return nullptr;
+  const char* const begin = pattern_search::SkipWhiteSpace(from, close);
+  const char* end = close;
+  while (end > begin && pattern_search::IsWhiteSpace(end[-1]))
+    --end;
+  content = std::string_view(begin, static_cast<std::size_t>(end - begin));
+  return close + 1;
+}
+
 }  // namespace
 
 bool Lum_DataPackage::XML_OpeningTag(const char* name) {
   if (write) {
     AppendPieces({Newline(), Indentation(), "<", name, ">"});
   } else {
+    const std::string_view wanted(name);
     std::string_view content;
     do {
       MoveCursorAfter("<");
-      content = TextBefore(">");
-      MoveCursorAfter(">");
-    } while (!content.empty() && !content.starts_with(name));
+      if (const char* after = NearbyTagEnd(bufferStart + bufferCursor, textEnd, content)) {
+        bufferCursor = static_cast<int>(after - bufferStart);
+      } else {
+        content = TextBefore(">");
+        MoveCursorAfter(">");
+      }
+    } while (!content.empty() && !content.starts_with(wanted));
   }
   ++treeDepth;
   return true;
@@ -73,12 +92,18 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
   const int start = bufferCursor;
   const std::size_t nameLength = std::strlen(name);
   std::string_view head;  // the tag's content, cut to the name's length
+  const std::string_view wanted(name, nameLength);
   do {
     MoveCursorAfter("<");
-    head = TextBefore(">").substr(0, nameLength);
-    MoveCursorAfter(">");
-  } while (id == 0 && !head.empty() && head != name);
-  if (head != name) {
+    if (const char* after = NearbyTagEnd(bufferStart + bufferCursor, textEnd, head)) {
+      bufferCursor = static_cast<int>(after - bufferStart);
+    } else {
+      head = TextBefore(">");
+      MoveCursorAfter(">");
+    }
+    head = head.substr(0, nameLength);
+  } while (id == 0 && !head.empty() && head != wanted);
+  if (head != wanted) {
     bufferCursor = start;
     return false;
   }
@@ -92,12 +117,17 @@ void Lum_DataPackage::XML_ClosingTag(const char* name) {
     AppendPieces({Newline(), Indentation(), "</", name, ">"});
     return;
   }
+  const std::string_view wanted(name);
   std::string_view content;
   do {
     MoveCursorAfter("</");
-    content = TextBefore(">");
-    MoveCursorAfter(">");
-  } while (!content.empty() && content != name);
+    if (const char* after = NearbyTagEnd(bufferStart + bufferCursor, textEnd, content)) {
+      bufferCursor = static_cast<int>(after - bufferStart);
+    } else {
+      content = TextBefore(">");
+      MoveCursorAfter(">");
+    }
+  } while (!content.empty() && content != wanted);
 }
 
 void Lum_DataPackage::WriteTypedElement(std::string_view name, std::string_view type,

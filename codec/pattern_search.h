@@ -16,6 +16,20 @@
 
 namespace pattern_search {
 
+#if defined(PACKAGE_SEARCH_SSE2)
+
+inline unsigned LowestBit(unsigned mask) {
+#if defined(_MSC_VER) && !defined(__clang__)
+  unsigned long index;
+  _BitScanForward(&index, mask);
+  return static_cast<unsigned>(index);
+#else
+  return static_cast<unsigned>(__builtin_ctz(mask));
+#endif
+}
+
+#endif
+
 // The package's whitespace: CR, LF, TAB and space.
 inline bool IsWhiteSpace(char c) { return c == '\r' || c == '\n' || c == '\t' || c == ' '; }
 
@@ -43,20 +57,6 @@ inline const char* FindFar(const char* p, const char* end, std::string_view patt
   }
   return nullptr;
 }
-
-#if defined(PACKAGE_SEARCH_SSE2)
-
-inline unsigned LowestBit(unsigned mask) {
-#if defined(_MSC_VER) && !defined(__clang__)
-  unsigned long index;
-  _BitScanForward(&index, mask);
-  return static_cast<unsigned>(index);
-#else
-  return static_cast<unsigned>(__builtin_ctz(mask));
-#endif
-}
-
-#endif
 
 // The first occurrence of `pattern` starting in [p, end), or null. Every byte of an occurrence
 // that starts before `end` lies before `readable`, and nothing at or after `readable` is read:

@@ -61,10 +61,20 @@ TEST(PatternSearchTest, WhiteSpaceIsFourBytes) {
     const bool expected = c == '\r' || c == '\n' || c == '\t' || c == ' ';
     EXPECT_EQ(pattern_search::IsWhiteSpace(static_cast<char>(c)), expected) << c;
   }
-  const std::string_view text = " \t\r\n\v x";
-  EXPECT_EQ(pattern_search::SkipWhiteSpace(text.data(), text.data() + text.size()),
-            text.data() + 4);
-  EXPECT_EQ(pattern_search::SkipWhiteSpace(text.data(), text.data() + 2), text.data() + 2);
+  // Whitespace runs on both sides of the sixteen-byte steps, ending in another byte or at the
+  // end of the text.
+  for (std::size_t run = 0; run <= 40; ++run) {
+    std::string white;
+    for (std::size_t i = 0; i < run; ++i)
+      white += " \t\r\n"[i % 4];
+    for (const std::string& text : {white, white + "\v", white + "x  "}) {
+      const GuardedBuffer guarded(text);
+      const char* const end = guarded.data() + guarded.size();
+      EXPECT_EQ(pattern_search::SkipWhiteSpace(guarded.data(), end), guarded.data() + run) << run;
+      EXPECT_EQ(pattern_search::SkipWhiteSpace(guarded.data(), guarded.data() + run / 2),
+                guarded.data() + run / 2);
+    }
+  }
 }
 
 }  // namespace
