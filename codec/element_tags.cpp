@@ -10,10 +10,7 @@
 
 namespace {
 
-constexpr std::string_view kVectorFormat = "%f %f %f";
-constexpr std::string_view kMatrixFormat = "%f %f %f %f, %f %f %f %f, %f %f %f %f, %f %f %f %f";
-
-// Formats floats as the scan formats above read them back: a space between numbers, a comma
+// Formats floats as the readers take them back: a space between numbers, a comma
 // before the space that starts a new row of four.
 std::string_view FormatFloats(const float* values, int count, char* out) {
   char* end = out;
@@ -27,13 +24,12 @@ std::string_view FormatFloats(const float* values, int count, char* out) {
   return std::string_view(out, static_cast<std::size_t>(end - out));
 }
 
-// Reading, at `at` just after a typed element's opening tag: scans the numbers of `format` into
-// `values` and returns where the search for the ">" that ends the element may start. What the
-// scan matched holds no ">", so that is past it.
-const char* ScanNumbers(const char* at, const char* textEnd, std::string_view format,
-                        float* values) {
+// Reading, at `at` just after a typed element's opening tag: scans `count` numbers as "%f %f ..."
+// does, with a comma after every fourth of a matrix, and returns where the search for the ">"
+// that ends the element may start. What the scan matched holds no ">", so that is past it.
+const char* ScanNumbers(const char* at, const char* textEnd, int count, float* values) {
   const char* end = at;
-  numbers::ScanFloats(at, textEnd, format, values, &end);
+  numbers::ScanFloatGroups(at, textEnd, count, count == 16 ? 4 : count, values, &end);
   return end;
 }
 
@@ -205,7 +201,7 @@ void Lum_DataPackage::XML_ValueTag(const char* name, float& value) {
     WriteTypedElement(name, "Val", FormatFloats(&value, 1, tmp2));
   } else if (ReadTypedElementName(name)) {
     if (const char* close =
-            NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, "%f", &value), textEnd)) {
+            NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 1, &value), textEnd)) {
       bufferCursor = static_cast<int>(close + 1 - bufferStart);
     } else {
       MoveCursorAfter(">");
@@ -222,8 +218,8 @@ void Lum_DataPackage::XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
     return;
   }
   if (ReadTypedElementName(name)) {
-    if (const char* close = NearbyClose(
-            ScanNumbers(bufferStart + bufferCursor, textEnd, kVectorFormat, values), textEnd)) {
+    if (const char* close =
+            NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 3, values), textEnd)) {
       bufferCursor = static_cast<int>(close + 1 - bufferStart);
     } else {
       MoveCursorAfter(">");
@@ -242,8 +238,8 @@ void Lum_DataPackage::XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
     return;
   }
   if (ReadTypedElementName(name)) {
-    if (const char* close = NearbyClose(
-            ScanNumbers(bufferStart + bufferCursor, textEnd, kMatrixFormat, values), textEnd)) {
+    if (const char* close =
+            NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 16, values), textEnd)) {
       bufferCursor = static_cast<int>(close + 1 - bufferStart);
     } else {
       MoveCursorAfter(">");

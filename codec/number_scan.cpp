@@ -342,31 +342,43 @@ const char* ScanFloat(const char* first, const char* last, float& value) {
   return ScanSlow(p, last, value);
 }
 
-int ScanFloats(const char* first, const char* last, std::string_view format, float* values,
-               const char** end) {
+int ScanFloats(const char* first, const char* last, std::string_view format, float* values) {
   int stored = 0;
   const char* p = first;
-  const auto stop = [&] {
-    if (end) *end = p;
-    return stored;
-  };
   for (std::size_t i = 0; i < format.size(); ++i) {
     const char directive = format[i];
     if (directive == '%') {
-      if (i + 1 == format.size() || format[++i] != 'f') return stop();
-      const char* const scanned = ScanFloat(p, last, values[stored]);
-      if (scanned == nullptr) return stop();
-      p = scanned;
+      if (i + 1 == format.size() || format[++i] != 'f') return stored;
+      const char* const end = ScanFloat(p, last, values[stored]);
+      if (end == nullptr) return stored;
+      p = end;
       ++stored;
     } else if (IsSpace(directive)) {
       p = SkipSpace(p, last);
     } else if (directive == '\0' || At(p, last) != directive) {
-      return stop();  // a NUL ends a C format string
+      return stored;  // a NUL ends a C format string
     } else {
       ++p;
     }
   }
-  return stop();
+  return stored;
+}
+
+int ScanFloatGroups(const char* first, const char* last, int count, int group, float* values,
+                    const char** end) {
+  int stored = 0;
+  const char* p = first;
+  while (const char* const scanned = ScanFloat(p, last, values[stored])) {
+    p = scanned;
+    if (++stored == count) break;
+    if (stored % group == 0) {
+      if (At(p, last) != ',') break;
+      ++p;
+    }
+    p = SkipSpace(p, last);
+  }
+  *end = p;
+  return stored;
 }
 
 }  // namespace numbers
