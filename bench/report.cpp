@@ -100,7 +100,7 @@ std::string Verdict(double value, double target) {
 // A package size as people say it: 184 B, 4.0 KB, 1.0 MB.
 std::string Size(double bytes) {
   if (bytes < 1e3) return Number(bytes, "%.0f B");
-  if (bytes < 1e6) return Number(bytes / 1e3, "%.1f KB");
+  if (IsSmall(bytes)) return Number(bytes / 1e3, "%.1f KB");
   return Number(bytes / 1e6, "%.1f MB");
 }
 
@@ -378,6 +378,28 @@ void Report(const std::vector<Figures>& all, const std::vector<std::string>& wor
       }
       data << "\n\n";
     }
+  }
+  // One block a workload: package MB, then ours over the fastest peer and over the floor, writing
+  // and reading.
+  std::ofstream ratios(folder + "/ratios.dat");
+  for (const std::string& w : workloads) {
+    if (table.Largest(w) < 1) continue;
+    ratios << "# " << w << " ratios\n";
+    for (int size = 0; size <= table.Largest(w); ++size) {
+      const Figures* ours = table.Find(w, size, Contestant::kOurs, Op::kRead);
+      if (!ours) continue;
+      ratios << ours->bytes / 1e6;
+      for (Op op : {Op::kWrite, Op::kRead}) {
+        const double speed = table.Speed(w, size, Contestant::kOurs, op);
+        for (const double other :
+             {table.FastestPeer(w, size, op), table.Speed(w, size, Contestant::kFloor, op)}) {
+          const double ratio = speed / other;
+          ratios << ' ' << (std::isnan(ratio) ? std::string("NaN") : Number(ratio, "%.3f"));
+        }
+      }
+      ratios << '\n';
+    }
+    ratios << "\n\n";
   }
   std::ofstream(folder + "/chart-title.gp")
       << "machine = "
