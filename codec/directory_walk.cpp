@@ -26,10 +26,11 @@ int EntryCount(float count) {
   return static_cast<int>(count);
 }
 
-// Copies a name into a fixed field when it fits there; a longer one is used where it stands.
-const char* NameIn(char (&field)[Lum_DataPackage::kTextLength], const char* name) {
+// Copies a name into a fixed field when it fits there; a longer one is used where it stands. The
+// element functions take names as char*, and never write them.
+char* NameIn(char (&field)[Lum_DataPackage::kTextLength], const char* name) {
   const std::size_t length = std::strlen(name);
-  if (length >= sizeof(field)) return name;
+  if (length >= sizeof(field)) return const_cast<char*>(name);
   std::memcpy(field, name, length + 1);
   return field;
 }
@@ -129,7 +130,7 @@ void Lum_DataPackage::ReadWriteData() {
     Vorn_Channel* child = GetChildFromLinkPosition(kDataLink, position);
     if (!child) continue;
     const GUID kind = child->GetChannelType().baseTypeGuid;
-    const char* name = NameIn(strg2, child->GetChannelName());
+    char* name = NameIn(strg2, child->GetChannelName());
     if (SameGuid(kind, kStringChannelGuid)) {
       auto* text = static_cast<Lum_StringChannel*>(child);
       if (write) {

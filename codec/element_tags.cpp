@@ -4,6 +4,7 @@
 
 #include "codec/number_format.h"
 #include "codec/number_scan.h"
+#include "codec/white_space.h"
 #include "plugin/data_package.h"
 
 namespace {
@@ -27,22 +28,22 @@ std::string_view FormatFloats(const float* values, int count, char* out) {
 
 }  // namespace
 
-bool Lum_DataPackage::XML_OpeningTag(const char* name) {
+bool Lum_DataPackage::XML_OpeningTag(char* name) {
   if (write) {
     AppendPieces({Newline(), Indentation(), "<", name, ">"});
   } else {
     std::string_view content;
     do {
-      MoveCursorAfter("<");
+      MovePast("<");
       content = TextBefore(">");
-      MoveCursorAfter(">");
+      MovePast(">");
     } while (!content.empty() && !content.starts_with(name));
   }
   ++treeDepth;
   return true;
 }
 
-bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
+bool Lum_DataPackage::XML_OpeningIDTag(char* name, int id) {
   if (write) {
     char number[12];
     const std::string_view idText(number, numbers::FormatInt(id, number));
@@ -54,9 +55,9 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
   const std::size_t nameLength = std::strlen(name);
   std::string_view head;  // the tag's content, cut to the name's length
   do {
-    MoveCursorAfter("<");
+    MovePast("<");
     head = TextBefore(">").substr(0, nameLength);
-    MoveCursorAfter(">");
+    MovePast(">");
   } while (id == 0 && !head.empty() && head != name);
   if (head != name) {
     bufferCursor = start;
@@ -66,7 +67,7 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
   return true;
 }
 
-void Lum_DataPackage::XML_ClosingTag(const char* name) {
+void Lum_DataPackage::XML_ClosingTag(char* name) {
   --treeDepth;
   if (write) {
     AppendPieces({Newline(), Indentation(), "</", name, ">"});
@@ -74,9 +75,9 @@ void Lum_DataPackage::XML_ClosingTag(const char* name) {
   }
   std::string_view content;
   do {
-    MoveCursorAfter("</");
+    MovePast("</");
     content = TextBefore(">");
-    MoveCursorAfter(">");
+    MovePast(">");
   } while (!content.empty() && content != name);
 }
 
@@ -90,8 +91,8 @@ void Lum_DataPackage::WriteTypedElement(std::string_view name, std::string_view 
 // after its opening tag; otherwise puts the cursor back and reports false.
 // A name that trimmed text can equal, and in which no "Type=" cuts the text short.
 bool Lum_DataPackage::IsPlainName(std::string_view name) {
-  return !name.empty() && name.size() < kTextLength && !IsWhiteSpace(name.front()) &&
-         !IsWhiteSpace(name.back()) && name.find("Type=") == std::string_view::npos;
+  return !name.empty() && name.size() < kTextLength && !IsWhiteSpaceChar(name.front()) &&
+         !IsWhiteSpaceChar(name.back()) && name.find("Type=") == std::string_view::npos;
 }
 
 bool Lum_DataPackage::ReadTypedElementName(const char* name) {
@@ -107,40 +108,40 @@ bool Lum_DataPackage::ReadTypedElementName(const char* name) {
                        std::memcmp(p, name, length) == 0 &&
                        std::string_view(SkipWhiteSpace(p + length), textEnd).starts_with("Type=");
     bufferCursor = match ? static_cast<int>(p + length - bufferStart) : start;
-    if (match) MoveCursorAfter(">");
+    if (match) MovePast(">");
     return match;
   }
-  MoveCursorAfter("<");
+  MovePast("<");
   CutStringBefore("Type=", tmp2);
-  MoveCursorAfter(">");
+  MovePast(">");
   if (std::strcmp(tmp2, name) == 0) return true;
   bufferCursor = start;
   return false;
 }
 
-void Lum_DataPackage::XML_StringTag(const char* name, char* text) {
+void Lum_DataPackage::XML_StringTag(char* name, char* text) {
   if (write) {
     WriteTypedElement(name, "Txt", text);
   } else if (ReadTypedElementName(name)) {
     CutStringBefore("</", text);
-    MoveCursorAfter(">");
+    MovePast(">");
   } else {
     text[0] = '\0';
   }
 }
 
-void Lum_DataPackage::XML_ValueTag(const char* name, float& value) {
+void Lum_DataPackage::XML_ValueTag(char* name, float& value) {
   if (write) {
     WriteTypedElement(name, "Val", FormatFloats(&value, 1, tmp2));
   } else if (ReadTypedElementName(name)) {
     numbers::ScanFloat(bufferStart + bufferCursor, textEnd, value);
-    MoveCursorAfter(">");
+    MovePast(">");
   } else {
     value = 0.0f;
   }
 }
 
-void Lum_DataPackage::XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
+void Lum_DataPackage::XML_VectorTag(char* name, D3DXVECTOR3& vector) {
   float values[3] = {vector.x, vector.y, vector.z};
   if (write) {
     WriteTypedElement(name, "Vec", FormatFloats(values, 3, tmp2));
@@ -148,14 +149,14 @@ void Lum_DataPackage::XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
   }
   if (ReadTypedElementName(name)) {
     numbers::ScanFloats(bufferStart + bufferCursor, textEnd, kVectorFormat, values);
-    MoveCursorAfter(">");
+    MovePast(">");
   } else {
     values[0] = values[1] = values[2] = 0.0f;
   }
   vector = {values[0], values[1], values[2]};
 }
 
-void Lum_DataPackage::XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
+void Lum_DataPackage::XML_MatrixTag(char* name, D3DXMATRIX& matrix) {
   float values[16];
   std::memcpy(values, &matrix, sizeof(values));
   if (write) {
@@ -164,7 +165,7 @@ void Lum_DataPackage::XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
   }
   if (ReadTypedElementName(name)) {
     numbers::ScanFloats(bufferStart + bufferCursor, textEnd, kMatrixFormat, values);
-    MoveCursorAfter(">");
+    MovePast(">");
   } else {
     std::memset(values, 0, sizeof(values));
   }

@@ -126,7 +126,7 @@ TEST(ScramblingTest, AmountsFollowTheWrappingRule) {
 
   const int length = 200000;
   std::vector<char> zeros(length, 0);
-  Lum_DataPackage::Encrypt(zeros.data(), length);
+  Access::Any().Encrypt(zeros.data(), length);
   for (int i = 0; i < length; ++i) {
     ASSERT_EQ(static_cast<std::uint8_t>(zeros[i]), static_cast<std::uint8_t>(Amount(i))) << i;
     if (i >= 12 && i <= 46340) {
@@ -135,10 +135,10 @@ TEST(ScramblingTest, AmountsFollowTheWrappingRule) {
   }
 
   char abc[] = "abc";
-  Lum_DataPackage::Encrypt(abc, 3);
+  Access::Any().Encrypt(abc, 3);
   EXPECT_STREQ(abc, "cce");
-  Lum_DataPackage::Encrypt(abc, 0);
-  Lum_DataPackage::Encrypt(abc, -4);
+  Access::Any().Encrypt(abc, 0);
+  Access::Any().Encrypt(abc, -4);
   EXPECT_STREQ(abc, "cce");
 }
 
@@ -149,11 +149,11 @@ TEST(ScramblingTest, DecryptUndoesEncryptAtEveryLength) {
     for (char& c : original)
       c = static_cast<char>(random());
     std::vector<char> data = original;
-    Lum_DataPackage::Encrypt(data.data(), length);
+    Access::Any().Encrypt(data.data(), length);
     if (length > 0) {
       EXPECT_NE(data, original) << length;
     }
-    Lum_DataPackage::Decrypt(data.data(), length);
+    Access::Any().Decrypt(data.data(), length);
     EXPECT_EQ(data, original) << length;
   }
 }
