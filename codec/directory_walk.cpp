@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <cstring>
 
+#include "codec/cleanup.h"
 #include "host/matrix_channel.h"
 #include "host/value_channel.h"
 #include "host/vector_channel.h"
@@ -52,21 +53,25 @@ int Lum_DataPackage::ReadWriteDirectory(bool) {
   TakeTagName();
 
   walkPath[walkDepth++] = this;
-  if (write && entryCount == 0) {
-    XML_OpeningTag(tagName);
-    XML_ClosingTag(tagName);
-  }
   int index = 0;
-  for (; index < entryCount && !PackageTooLarge(); ++index) {
-    if (currentIndex) AsValue(currentIndex)->SetValue(static_cast<float>(index));
-    if (write && callEachIteration) callEachIteration->CallChannel();
-    if (!OpenEntry(index, entryCount)) break;
-    ReadWriteData();
-    ReadWriteSubDirectories();
-    XML_ClosingTag(tagName);
-    if (!write && callEachIteration) callEachIteration->CallChannel();
-  }
-  --walkDepth;
+  // A directory left on the path by a channel's exception would never be walked again.
+  RunThenCleanUp(
+      [&] {
+        if (write && entryCount == 0) {
+          XML_OpeningTag(tagName);
+          XML_ClosingTag(tagName);
+        }
+        for (; index < entryCount && !PackageTooLarge(); ++index) {
+          if (currentIndex) AsValue(currentIndex)->SetValue(static_cast<float>(index));
+          if (write && callEachIteration) callEachIteration->CallChannel();
+          if (!OpenEntry(index, entryCount)) break;
+          ReadWriteData();
+          ReadWriteSubDirectories();
+          XML_ClosingTag(tagName);
+          if (!write && callEachIteration) callEachIteration->CallChannel();
+        }
+      },
+      [] { --walkDepth; });
 
   if (!write && count) AsValue(count)->SetValue(static_cast<float>(index));
   return bufferCursor;
