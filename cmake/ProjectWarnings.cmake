@@ -4,9 +4,15 @@
 option(DATADIRECTORY_WERROR "Treat warnings in our own code as errors" OFF)
 
 function(project_warnings target)
-  target_compile_options(${target} PRIVATE -Wall -Wextra -Wpedantic)
+  if(DATADIRECTORY_MSVC_ABI)
+    # cl's /W4 is GCC's -Wall -Wextra; cl's own -Wall would be every warning clang has.
+    # Its structured exceptions and declspecs are language extensions by nature.
+    target_compile_options(${target} PRIVATE /W4 -Wpedantic -Wno-language-extension-token)
+  else()
+    target_compile_options(${target} PRIVATE -Wall -Wextra -Wpedantic)
+  endif()
   if(DATADIRECTORY_WERROR)
-    target_compile_options(${target} PRIVATE -Werror)
+    target_compile_options(${target} PRIVATE $<IF:$<BOOL:${DATADIRECTORY_MSVC_ABI}>,/WX,-Werror>)
   endif()
 endfunction()
 
@@ -20,6 +26,8 @@ function(vorn_library target output_name build_macro)
     CXX_VISIBILITY_PRESET hidden
     VISIBILITY_INLINES_HIDDEN ON)
   # Exported members still call each other directly and inline: nothing replaces them at load.
-  target_compile_options(${target} PRIVATE -fno-semantic-interposition)
+  if(NOT WIN32)
+    target_compile_options(${target} PRIVATE -fno-semantic-interposition)
+  endif()
   project_warnings(${target})
 endfunction()
