@@ -202,4 +202,27 @@ TEST(EntryPointsTest, OperationsStartedInsideAnotherChangeNothing) {
   EXPECT_EQ(package, expected);
 }
 
+// A channel's exception passes through the walk to the caller, and every later operation works
+// as if it had never happened.
+TEST(EntryPointsTest, AnExceptionFromAChannelLeavesLaterOperationsWhole) {
+  Players players;
+  Lum_DataPackage* sub = players.tree.SubDirectory(players.directory, "Sub");
+  players.tree.Text(sub, "Note", "deep");
+  bool throwing = true;
+  players.tree.CallEachIteration(sub, [&] {
+    if (throwing) throw 42;
+  });
+  std::string buffer(4096, '\0');
+  EXPECT_THROW(players.directory->WriteToBuffer(buffer.data(), 4096, true, false), int);
+  throwing = false;
+  const std::string package = WritePackage(*players.directory);
+  EXPECT_NE(package.find("<Note Type=\"Txt\"> deep </Note>"), std::string::npos);
+
+  throwing = true;
+  EXPECT_THROW(ReadPackage(*players.directory, package), int);
+  throwing = false;
+  EXPECT_EQ(ReadPackage(*players.directory, package), static_cast<int>(package.size()));
+  EXPECT_EQ(WritePackage(*players.directory), package);
+}
+
 }  // namespace

@@ -186,6 +186,54 @@ void CheckSamples(const char* folder) {
   }
 }
 
+// The engine's C++ exceptions are structured exceptions underneath; one passing through a
+// package operation must leave the next ones working.
+bool raising = false;
+void RaiseFromChannel() {
+  if (raising) RaiseException(0xE0000001u, 0, 0, nullptr);
+}
+
+bool WriteRaising(Vorn_Channel* top, char* buffer, int size) {
+  __try {
+    writeToBuffer(top, buffer, size, true, false);
+  } __except (GetExceptionCode() == 0xE0000001u ? EXCEPTION_EXECUTE_HANDLER
+                                                : EXCEPTION_CONTINUE_SEARCH) {
+    return true;
+  }
+  return false;
+}
+
+bool ReadRaising(Vorn_Channel* top, char* buffer, int size) {
+  __try {
+    readFromBuffer(top, buffer, size, true, false);
+  } __except (GetExceptionCode() == 0xE0000001u ? EXCEPTION_EXECUTE_HANDLER
+                                                : EXCEPTION_CONTINUE_SEARCH) {
+    return true;
+  }
+  return false;
+}
+
+void CheckExceptionsPassThrough() {
+  const samples::Factories factories = {NewDirectory, NewText};
+  samples::Tree tree(samples::kSamples[3], factories);  // nested: raised two directories deep
+  std::vector<char> buffer(8192);
+  samples::Tree::onCall = RaiseFromChannel;
+  raising = true;
+  Check(WriteRaising(tree.Top(), buffer.data(), 8192), "an exception passes through a write");
+  raising = false;
+  tree.Supply();
+  const int size = writeToBuffer(tree.Top(), buffer.data(), 8192, false, false);
+  Check(size == 1145, "the next write is whole");
+
+  raising = true;
+  Check(ReadRaising(tree.Top(), buffer.data(), size), "an exception passes through a read");
+  raising = false;
+  tree.Collect();
+  Check(readFromBuffer(tree.Top(), buffer.data(), size, false, false) == size - 1,
+        "the next read is whole");
+  samples::Tree::onCall = nullptr;
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
@@ -218,6 +266,7 @@ int main(int argc, char** argv) {
   Check(std::strcmp(abc, "abc") == 0, "Decrypt undoes it");
 
   CheckSamples(folder);
+  CheckExceptionsPassThrough();
 
   // The engine destroys channels through slot 0, the deleting destructor, or through the base.
   void* result = Slot<DeletingDestructorSlot>(first, 0)(first, 1);
