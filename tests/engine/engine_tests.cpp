@@ -32,8 +32,7 @@ void Check(bool ok, const char* what, const char* detail = "") {
 using GetTypeFunction = ChannelType*(__cdecl*)();
 using InitDllFunction = Vorn_Channel*(__cdecl*)();
 // Members as a caller that links the DLL reaches them: by decorated name, `this` in ecx.
-using WriteToBufferMember = int(__thiscall*)(void* self, char*, int, bool, bool);
-using ReadFromBufferMember = int(__thiscall*)(void* self, char*, int, bool, bool);
+using WriteToBufferMember = int(__thiscall*)(void* self, char*, int, bool, bool);  // and Read
 using ScrambleMember = void(__thiscall*)(void* self, char*, int);
 // Slots of the table: the destructor takes one, Vorn_Channel's twelve others follow, then the
 // string channel's.
@@ -76,7 +75,7 @@ Library Load(const char* file) {
 Library directories;
 Library texts;
 WriteToBufferMember writeToBuffer;
-ReadFromBufferMember readFromBuffer;
+WriteToBufferMember readFromBuffer;  // the same signature
 ScrambleMember encrypt;
 ScrambleMember decrypt;
 
@@ -193,19 +192,10 @@ void RaiseFromChannel() {
   if (raising) RaiseException(0xE0000001u, 0, 0, nullptr);
 }
 
-bool WriteRaising(Vorn_Channel* top, char* buffer, int size) {
+// Whether a package operation let the channel's exception through to its caller.
+bool PassesThrough(WriteToBufferMember operation, Vorn_Channel* top, char* buffer, int size) {
   __try {
-    writeToBuffer(top, buffer, size, true, false);
-  } __except (GetExceptionCode() == 0xE0000001u ? EXCEPTION_EXECUTE_HANDLER
-                                                : EXCEPTION_CONTINUE_SEARCH) {
-    return true;
-  }
-  return false;
-}
-
-bool ReadRaising(Vorn_Channel* top, char* buffer, int size) {
-  __try {
-    readFromBuffer(top, buffer, size, true, false);
+    operation(top, buffer, size, false, false);
   } __except (GetExceptionCode() == 0xE0000001u ? EXCEPTION_EXECUTE_HANDLER
                                                 : EXCEPTION_CONTINUE_SEARCH) {
     return true;
@@ -219,14 +209,16 @@ void CheckExceptionsPassThrough() {
   std::vector<char> buffer(8192);
   samples::Tree::onCall = RaiseFromChannel;
   raising = true;
-  Check(WriteRaising(tree.Top(), buffer.data(), 8192), "an exception passes through a write");
+  Check(PassesThrough(writeToBuffer, tree.Top(), buffer.data(), 8192),
+        "an exception passes through a write");
   raising = false;
   tree.Supply();
   const int size = writeToBuffer(tree.Top(), buffer.data(), 8192, false, false);
   Check(size == 1145, "the next write is whole");
 
   raising = true;
-  Check(ReadRaising(tree.Top(), buffer.data(), size), "an exception passes through a read");
+  Check(PassesThrough(readFromBuffer, tree.Top(), buffer.data(), size),
+        "an exception passes through a read");
   raising = false;
   tree.Collect();
   Check(readFromBuffer(tree.Top(), buffer.data(), size, false, false) == size - 1,
