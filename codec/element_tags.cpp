@@ -6,6 +6,7 @@
 #include "codec/number_format.h"
 #include "codec/number_scan.h"
 #include "codec/pattern_search.h"
+#include "codec/white_space.h"
 #include "plugin/data_package.h"
 
 namespace {
@@ -41,7 +42,7 @@ const char* NearbyClose(const char* from, const char* textEnd) {
   return pattern_search::Find(from, end, textEnd, ">");
 }
 
-// What TextBefore(">") and then MoveCursorAfter(">") give from `from` when the ">" stands a few
+// What TextBefore(">") and then MovePast(">") give from `from` when the ">" stands a few
 // bytes ahead: the tag's content, trimmed, and where the cursor ends, just past the ">". Null
 // when it stands further, and the reader's own searches take over.
 const char* NearbyTagEnd(const char* from, const char* textEnd, std::string_view& content) {
@@ -49,7 +50,7 @@ const char* NearbyTagEnd(const char* from, const char* textEnd, std::string_view
   if (!close) return nullptr;
   const char* const begin = pattern_search::SkipWhiteSpace(from, close);
   const char* end = close;
-  while (end > begin && pattern_search::IsWhiteSpace(end[-1]))
+  while (end > begin && IsWhiteSpaceChar(end[-1]))
     --end;
   content = std::string_view(begin, static_cast<std::size_t>(end - begin));
   return close + 1;
@@ -57,19 +58,19 @@ const char* NearbyTagEnd(const char* from, const char* textEnd, std::string_view
 
 }  // namespace
 
-bool Lum_DataPackage::XML_OpeningTag(const char* name) {
+bool Lum_DataPackage::XML_OpeningTag(char* name) {
   if (write) {
     AppendPieces({Newline(), Indentation(), "<", name, ">"});
   } else {
     const std::string_view wanted(name);
     std::string_view content;
     do {
-      MoveCursorAfter("<");
+      MovePast("<");
       if (const char* after = NearbyTagEnd(bufferStart + bufferCursor, textEnd, content)) {
         bufferCursor = static_cast<int>(after - bufferStart);
       } else {
         content = TextBefore(">");
-        MoveCursorAfter(">");
+        MovePast(">");
       }
     } while (!content.empty() && !content.starts_with(wanted));
   }
@@ -77,7 +78,7 @@ bool Lum_DataPackage::XML_OpeningTag(const char* name) {
   return true;
 }
 
-bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
+bool Lum_DataPackage::XML_OpeningIDTag(char* name, int id) {
   if (write) {
     char number[12];
     const std::string_view idText(number, numbers::FormatInt(id, number));
@@ -90,12 +91,12 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
   std::string_view head;  // the tag's content, cut to the name's length
   const std::string_view wanted(name, nameLength);
   do {
-    MoveCursorAfter("<");
+    MovePast("<");
     if (const char* after = NearbyTagEnd(bufferStart + bufferCursor, textEnd, head)) {
       bufferCursor = static_cast<int>(after - bufferStart);
     } else {
       head = TextBefore(">");
-      MoveCursorAfter(">");
+      MovePast(">");
     }
     head = head.substr(0, nameLength);
   } while (id == 0 && !head.empty() && head != wanted);
@@ -107,7 +108,7 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
   return true;
 }
 
-void Lum_DataPackage::XML_ClosingTag(const char* name) {
+void Lum_DataPackage::XML_ClosingTag(char* name) {
   --treeDepth;
   if (write) {
     AppendPieces({Newline(), Indentation(), "</", name, ">"});
@@ -116,12 +117,12 @@ void Lum_DataPackage::XML_ClosingTag(const char* name) {
   const std::string_view wanted(name);
   std::string_view content;
   do {
-    MoveCursorAfter("</");
+    MovePast("</");
     if (const char* after = NearbyTagEnd(bufferStart + bufferCursor, textEnd, content)) {
       bufferCursor = static_cast<int>(after - bufferStart);
     } else {
       content = TextBefore(">");
-      MoveCursorAfter(">");
+      MovePast(">");
     }
   } while (!content.empty() && content != wanted);
 }
@@ -136,8 +137,8 @@ void Lum_DataPackage::WriteTypedElement(std::string_view name, std::string_view 
 // after its opening tag; otherwise puts the cursor back and reports false.
 // A name that trimmed text can equal, and in which no "Type=" cuts the text short.
 bool Lum_DataPackage::IsPlainName(std::string_view name) {
-  if (name.empty() || name.size() >= kTextLength || pattern_search::IsWhiteSpace(name.front()) ||
-      pattern_search::IsWhiteSpace(name.back())) {
+  if (name.empty() || name.size() >= kTextLength || IsWhiteSpaceChar(name.front()) ||
+      IsWhiteSpaceChar(name.back())) {
     return false;
   }
   // Names are short: a byte at a time beats a call.
@@ -173,30 +174,30 @@ bool Lum_DataPackage::ReadTypedElementName(const char* name) {
       bufferCursor = static_cast<int>(close + 1 - bufferStart);
     } else {
       bufferCursor = static_cast<int>(p + length - bufferStart);
-      MoveCursorAfter(">");
+      MovePast(">");
     }
     return true;
   }
-  MoveCursorAfter("<");
+  MovePast("<");
   CutStringBefore("Type=", tmp2);
-  MoveCursorAfter(">");
+  MovePast(">");
   if (std::strcmp(tmp2, name) == 0) return true;
   bufferCursor = start;
   return false;
 }
 
-void Lum_DataPackage::XML_StringTag(const char* name, char* text) {
+void Lum_DataPackage::XML_StringTag(char* name, char* text) {
   if (write) {
     WriteTypedElement(name, "Txt", text);
   } else if (ReadTypedElementName(name)) {
     CutStringBefore("</", text);
-    MoveCursorAfter(">");
+    MovePast(">");
   } else {
     text[0] = '\0';
   }
 }
 
-void Lum_DataPackage::XML_ValueTag(const char* name, float& value) {
+void Lum_DataPackage::XML_ValueTag(char* name, float& value) {
   if (write) {
     WriteTypedElement(name, "Val", FormatFloats(&value, 1, tmp2));
   } else if (ReadTypedElementName(name)) {
@@ -204,14 +205,14 @@ void Lum_DataPackage::XML_ValueTag(const char* name, float& value) {
             NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 1, &value), textEnd)) {
       bufferCursor = static_cast<int>(close + 1 - bufferStart);
     } else {
-      MoveCursorAfter(">");
+      MovePast(">");
     }
   } else {
     value = 0.0f;
   }
 }
 
-void Lum_DataPackage::XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
+void Lum_DataPackage::XML_VectorTag(char* name, D3DXVECTOR3& vector) {
   float values[3] = {vector.x, vector.y, vector.z};
   if (write) {
     WriteTypedElement(name, "Vec", FormatFloats(values, 3, tmp2));
@@ -222,7 +223,7 @@ void Lum_DataPackage::XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
             NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 3, values), textEnd)) {
       bufferCursor = static_cast<int>(close + 1 - bufferStart);
     } else {
-      MoveCursorAfter(">");
+      MovePast(">");
     }
   } else {
     values[0] = values[1] = values[2] = 0.0f;
@@ -230,7 +231,7 @@ void Lum_DataPackage::XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
   vector = {values[0], values[1], values[2]};
 }
 
-void Lum_DataPackage::XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
+void Lum_DataPackage::XML_MatrixTag(char* name, D3DXMATRIX& matrix) {
   float values[16];
   std::memcpy(values, &matrix, sizeof(values));
   if (write) {
@@ -242,7 +243,7 @@ void Lum_DataPackage::XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
             NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 16, values), textEnd)) {
       bufferCursor = static_cast<int>(close + 1 - bufferStart);
     } else {
-      MoveCursorAfter(">");
+      MovePast(">");
     }
   } else {
     std::memset(values, 0, sizeof(values));

@@ -6,6 +6,8 @@
 #include <cstring>
 #include <string_view>
 
+#include "codec/white_space.h"
+
 #if defined(__SSE2__) || defined(_M_X64) || (defined(_M_IX86_FP) && _M_IX86_FP >= 2)
 #define PACKAGE_SEARCH_SSE2 1
 #include <emmintrin.h>
@@ -30,11 +32,8 @@ inline unsigned LowestBit(unsigned mask) {
 
 #endif
 
-// The package's whitespace: CR, LF, TAB and space.
-inline bool IsWhiteSpace(char c) { return c == '\r' || c == '\n' || c == '\t' || c == ' '; }
-
 inline const char* SkipWhiteSpace(const char* p, const char* end) {
-  while (p < end && IsWhiteSpace(*p))
+  while (p < end && IsWhiteSpaceChar(*p))
     ++p;
   return p;
 }

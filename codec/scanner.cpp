@@ -5,6 +5,7 @@
 #include <cstring>
 
 #include "codec/pattern_search.h"
+#include "codec/white_space.h"
 #include "plugin/data_package.h"
 
 namespace {
@@ -69,7 +70,9 @@ void Lum_DataPackage::ForgetSearches() {
   ++readSerial;
 }
 
-void Lum_DataPackage::MoveCursorAfter(std::string_view pattern) {
+void Lum_DataPackage::MoveCursorAfter(const char* pattern) { MovePast(pattern); }
+
+void Lum_DataPackage::MovePast(std::string_view pattern) {
   if (const char* found = Find(pattern)) {
     bufferCursor = static_cast<int>(found - bufferStart + pattern.size());
   }
@@ -95,7 +98,7 @@ std::string_view Lum_DataPackage::TextBefore(std::string_view delimiter) {
   if (!end) return {};
   const char* const begin = pattern_search::SkipWhiteSpace(bufferStart + bufferCursor, textEnd);
   bufferCursor = static_cast<int>(begin - bufferStart);
-  while (end > begin && pattern_search::IsWhiteSpace(end[-1]))
+  while (end > begin && IsWhiteSpaceChar(end[-1]))
     --end;
   const std::size_t length = static_cast<std::size_t>(end - begin);
   if (length == 0 || length >= kTextLength) return {};
@@ -107,9 +110,9 @@ const char* Lum_DataPackage::SkipWhiteSpace(const char* p) {
   return pattern_search::SkipWhiteSpace(p, textEnd);
 }
 
-bool Lum_DataPackage::IsWhiteSpace(char c) { return pattern_search::IsWhiteSpace(c); }
+bool Lum_DataPackage::IsWhiteSpace(char c) { return IsWhiteSpaceChar(c); }
 
-bool Lum_DataPackage::MoveCursorBeforeTag(const char* name) {
+bool Lum_DataPackage::MoveCursorBeforeTag(char* name) {
   int unknown = INT_MAX;
   return SearchTag(name, unknown);
 }
@@ -134,7 +137,7 @@ bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
   int secondTag = -1;
   for (bool first = true;; first = false) {
     const int before = bufferCursor;
-    MoveCursorAfter("<");
+    MovePast("<");
     const int tag = bufferCursor - 1;
     if (bufferCursor == before || bufferStart + bufferCursor >= textEnd ||
         (!first && tag >= failsFrom)) {
@@ -149,7 +152,7 @@ bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
     if (!found) {
       // The name followed by an id attribute: cut at the whitespace before the first 'id="'.
       if (std::size_t id = content.find(kIdAttribute); id != std::string_view::npos) {
-        while (id > 0 && pattern_search::IsWhiteSpace(content[id - 1]))
+        while (id > 0 && IsWhiteSpaceChar(content[id - 1]))
           --id;
         found = content.substr(0, id) == name;
       }
@@ -161,7 +164,7 @@ bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
   }
 }
 
-int Lum_DataPackage::GetItemType(const char* name) {
+int Lum_DataPackage::GetItemType(char* name) {
   const int start = bufferCursor;
   const auto skipWhiteSpace = [] {
     bufferCursor = static_cast<int>(
@@ -176,7 +179,7 @@ int Lum_DataPackage::GetItemType(const char* name) {
   };
 
   int type = 0;
-  MoveCursorAfter("<");
+  MovePast("<");
   skipWhiteSpace();
   const std::size_t nameLength = std::strlen(name);
   if (StartsWith(rest(), name) && rest().size() > nameLength) {

@@ -43,10 +43,11 @@ void Scramble(const ScrambleOptions& options) {
   std::string bytes = ReadInput(options.input);
   CheckScramblable(bytes, StreamName(options.input, true));
   const int length = static_cast<int>(bytes.size());
+  Lum_DataPackage scrambler;
   if (options.undo) {
-    Lum_DataPackage::Decrypt(bytes.data(), length);
+    scrambler.Decrypt(bytes.data(), length);
   } else {
-    Lum_DataPackage::Encrypt(bytes.data(), length);
+    scrambler.Encrypt(bytes.data(), length);
   }
   WriteOutput(options.output, bytes);
 }
@@ -56,7 +57,7 @@ void Show(const ShowOptions& options) {
   std::string text = ReadInput(options.file);
   if (options.scrambled) {
     CheckScramblable(text, name);
-    Lum_DataPackage::Decrypt(text.data(), static_cast<int>(text.size()));
+    Lum_DataPackage().Decrypt(text.data(), static_cast<int>(text.size()));
   }
   text.resize(std::min(text.size(), text.find('\0')));  // the reader stops at a NUL
   const Plugins plugins = LoadPlugins();
