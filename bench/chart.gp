@@ -51,7 +51,7 @@ do for [block in "game-state@write nested@write text-heavy@write adversarial@wri
 # Targets: over the fastest peer 3 writing and reading below 1 MB, 2 reading from 1 MB on; over
 # the floor two thirds writing, one half reading.
 set ylabel "ours over" offset 1.5,0
-set yrange [0.1:20]
+set yrange [0.1:50]
 set key top left font ",9" samplen 2 spacing 1 maxrows 4
 readTarget(x) = x < 0.99 ? 3 : 2
 do for [name in "game-state nested text-heavy adversarial"] {
