@@ -66,7 +66,7 @@ class TESSEL_API Vorn_Channel {
   struct State;
   // The stand-in keeps its state elsewhere; nothing but this pointer lives in the room.
   State* state_;
-  unsigned char reserved_[kDataBytes - sizeof(State*)];
+  [[maybe_unused]] unsigned char reserved_[kDataBytes - sizeof(State*)];
 };
 
 static_assert(sizeof(Vorn_Channel) == sizeof(void*) + Vorn_Channel::kDataBytes,

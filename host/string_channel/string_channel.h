@@ -47,7 +47,7 @@ class STRING_CHANNEL_API Lum_StringChannel : public Vorn_Channel {
  private:
   struct State;
   State* state_;
-  unsigned char reserved_[kDataBytes - sizeof(State*)];
+  [[maybe_unused]] unsigned char reserved_[kDataBytes - sizeof(State*)];
 };
 
 static_assert(sizeof(Lum_StringChannel) == sizeof(Vorn_Channel) + Lum_StringChannel::kDataBytes,
