@@ -37,6 +37,16 @@ std::size_t ParseNumbers(const Workload& workload, const char* text, std::size_t
   return read;
 }
 
+void CopyTexts(const Workload& workload, Values& output) {
+  for (int l = 0; l < static_cast<int>(workload.levels.size()); ++l) {
+    const Level& level = workload.levels[static_cast<std::size_t>(l)];
+    for (std::size_t entry = 0; entry < level.entries; ++entry) {
+      for (int text = 0; text < level.textsPerEntry; ++text)
+        output.SetText(l, entry, text, workload.source.Text(l, entry, text));
+    }
+  }
+}
+
 std::size_t CountTags(const char* text, std::size_t length) {
   std::size_t tags = 0;
   const char* const last = text + length;

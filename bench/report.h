@@ -22,6 +22,7 @@ struct Figures {
   double bytes = 0;             // our package's size, the byte count of every contestant
   double ownBytes = 0;          // the size of the contestant's own text
   std::vector<double> seconds;  // per operation, one a repetition
+  int batch = 1;                // operations a timed iteration runs, so that small ones show
   double allocations = -1;      // per timed operation
   double peakHeap = -1;         // heap bytes above those before a first, untimed operation
   std::string error;
@@ -37,8 +38,8 @@ struct Machine {
 };
 Machine ThisMachine();
 
-// Prints the tables to stdout and writes results.json, results.txt, throughput.dat and
-// chart-title.gp into `folder`.
+// Prints the tables to stdout and writes results.json, results.txt, throughput.dat, ratios.dat
+// and chart-title.gp into `folder`.
 void Report(const std::vector<Figures>& figures, const std::vector<std::string>& workloads,
             const Machine& machine, const std::string& folder);
 

@@ -148,6 +148,8 @@ std::vector<Level> Levels(Shape shape, int scale) {
                 {"Stamp", K::kValue, Number<0, 999999, 2>}},
                notes}};
     }
+    case Shape::kPlayers:
+      return {{"Players", {{"Name", K::kText, Name}, {"Score", K::kValue, Number<0, 999, 1>}}, 2}};
     case Shape::kAdversarial: {
       // The tree asks for sub-directories S and T inside every entry of D; the text has none.
       const auto [zones, entries] = Split(scale);
@@ -292,7 +294,8 @@ std::size_t Workload::FloatCount() const {
 }
 
 const char* ShapeName(Shape shape) {
-  static constexpr const char* kNames[] = {"game-state", "nested", "text-heavy", "adversarial"};
+  static constexpr const char* kNames[] = {"game-state", "nested", "text-heavy", "adversarial",
+                                           "players"};
   return kNames[static_cast<int>(shape)];
 }
 
@@ -315,6 +318,15 @@ Workload MakeWorkload(Shape shape, int scale) {
     }
   }
   if (shape == Shape::kAdversarial) workload.hostileText = HostileText(workload);
+  if (shape == Shape::kPlayers) {
+    // The demo's entries, whose package is 184 bytes with its NUL.
+    const std::pair<const char*, float> players[] = {{"Ann", 12.5f}, {"Bob", 7.0f}};
+    workload.source.Poison();
+    for (std::size_t entry = 0; entry < 2; ++entry) {
+      workload.source.SetText(0, entry, 0, players[entry].first);
+      workload.source.Floats(0, entry)[0] = players[entry].second;
+    }
+  }
   return workload;
 }
 

@@ -67,6 +67,8 @@ class Values {
 
   // Unsets every value, so that a reader that skips one is caught.
   void Poison();
+  // Makes the texts' room free again for a reader that sets every text anew.
+  void Rewind() { used_ = 0; }
   std::uint64_t Checksum(bool withTexts = true) const;
 
  private:
@@ -89,7 +91,7 @@ class Values {
   bool growable_;
 };
 
-enum class Shape { kGameState, kNested, kTextHeavy, kAdversarial };
+enum class Shape { kGameState, kNested, kTextHeavy, kAdversarial, kPlayers };
 
 struct Workload {
   Shape shape;
@@ -103,7 +105,7 @@ struct Workload {
 };
 
 // `scale` counts the entries of the workload's main level: players, regions, notes or hostile
-// entries.
+// entries. The Players package is always the demo's two entries.
 Workload MakeWorkload(Shape shape, int scale);
 const char* ShapeName(Shape shape);
 

@@ -5,7 +5,7 @@
 
 #include "plugin/data_package.h"
 
-char* Lum_DataPackage::bufferStart = nullptr;
+const char* Lum_DataPackage::bufferStart = nullptr;
 const char* Lum_DataPackage::bufferEnd = nullptr;
 const char* Lum_DataPackage::textEnd = nullptr;
 int Lum_DataPackage::bufferCursor = 0;
@@ -84,7 +84,8 @@ void Lum_DataPackage::AppendPieces(std::initializer_list<std::string_view> piece
     length += static_cast<long long>(piece.size());
   const long long end = bufferCursor + length;
   if (end < bufferEnd - bufferStart) {
-    char* out = bufferStart + bufferCursor;
+    // The caller's buffer, writable: the member is const for the readers' sake.
+    char* out = const_cast<char*>(bufferStart) + bufferCursor;
     for (std::string_view piece : pieces)
       out = CopyPiece(piece, out);
     *out = '\0';
@@ -93,23 +94,20 @@ void Lum_DataPackage::AppendPieces(std::initializer_list<std::string_view> piece
   requiredSize = static_cast<int>(std::min<long long>(requiredSize + length, INT_MAX));
 }
 
-const char* Lum_DataPackage::GetTabs() {
-  const int tabs = std::clamp(treeDepth, 0, kMaxTabs);
-  std::memset(tabsBuffer, '\t', tabs);
-  tabsBuffer[tabs] = '\0';
-  return tabsBuffer;
-}
+const char* Lum_DataPackage::GetTabs() { return Indentation().data(); }
 
 const char* Lum_DataPackage::GetNewline() {
-  newlineBuffer[0] = fileNoTxtChan ? '\n' : '\r';
-  newlineBuffer[1] = fileNoTxtChan ? '\0' : '\n';
-  newlineBuffer[2] = '\0';
+  const std::string_view newline = Newline();
+  std::memcpy(newlineBuffer, newline.data(), newline.size() + 1);
   return newlineBuffer;
 }
 
 // GetNewline and GetTabs with their lengths, as the element writers put them together.
-std::string_view Lum_DataPackage::Newline() { return {GetNewline(), fileNoTxtChan ? 1u : 2u}; }
+std::string_view Lum_DataPackage::Newline() { return fileNoTxtChan ? "\n" : "\r\n"; }
 
 std::string_view Lum_DataPackage::Indentation() {
-  return {GetTabs(), static_cast<std::size_t>(std::clamp(treeDepth, 0, kMaxTabs))};
+  const int tabs = std::clamp(treeDepth, 0, kMaxTabs);
+  std::memset(tabsBuffer, '\t', static_cast<std::size_t>(tabs));
+  tabsBuffer[tabs] = '\0';
+  return {tabsBuffer, static_cast<std::size_t>(tabs)};
 }

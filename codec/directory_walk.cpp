@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <cstring>
 
+#include "codec/cleanup.h"
 #include "host/matrix_channel.h"
 #include "host/value_channel.h"
 #include "host/vector_channel.h"
@@ -26,10 +27,11 @@ int EntryCount(float count) {
   return static_cast<int>(count);
 }
 
-// Copies a name into a fixed field when it fits there; a longer one is used where it stands.
-const char* NameIn(char (&field)[Lum_DataPackage::kTextLength], const char* name) {
+// Copies a name into a fixed field when it fits there; a longer one is used where it stands. The
+// element functions take names as char*, and never write them.
+char* NameIn(char (&field)[Lum_DataPackage::kTextLength], const char* name) {
   const std::size_t length = std::strlen(name);
-  if (length >= sizeof(field)) return name;
+  if (length >= sizeof(field)) return const_cast<char*>(name);
   std::memcpy(field, name, length + 1);
   return field;
 }
@@ -51,21 +53,25 @@ int Lum_DataPackage::ReadWriteDirectory(bool) {
   TakeTagName();
 
   walkPath[walkDepth++] = this;
-  if (write && entryCount == 0) {
-    XML_OpeningTag(tagName);
-    XML_ClosingTag(tagName);
-  }
   int index = 0;
-  for (; index < entryCount && !PackageTooLarge(); ++index) {
-    if (currentIndex) AsValue(currentIndex)->SetValue(static_cast<float>(index));
-    if (write && callEachIteration) callEachIteration->CallChannel();
-    if (!OpenEntry(index, entryCount)) break;
-    ReadWriteData();
-    ReadWriteSubDirectories();
-    XML_ClosingTag(tagName);
-    if (!write && callEachIteration) callEachIteration->CallChannel();
-  }
-  --walkDepth;
+  // A directory left on the path by a channel's exception would never be walked again.
+  RunThenCleanUp(
+      [&] {
+        if (write && entryCount == 0) {
+          XML_OpeningTag(tagName);
+          XML_ClosingTag(tagName);
+        }
+        for (; index < entryCount && !PackageTooLarge(); ++index) {
+          if (currentIndex) AsValue(currentIndex)->SetValue(static_cast<float>(index));
+          if (write && callEachIteration) callEachIteration->CallChannel();
+          if (!OpenEntry(index, entryCount)) break;
+          ReadWriteData();
+          ReadWriteSubDirectories();
+          XML_ClosingTag(tagName);
+          if (!write && callEachIteration) callEachIteration->CallChannel();
+        }
+      },
+      [] { --walkDepth; });
 
   if (!write && count) AsValue(count)->SetValue(static_cast<float>(index));
   return bufferCursor;
@@ -129,7 +135,7 @@ void Lum_DataPackage::ReadWriteData() {
     Vorn_Channel* child = GetChildFromLinkPosition(kDataLink, position);
     if (!child) continue;
     const GUID kind = child->GetChannelType().baseTypeGuid;
-    const char* name = NameIn(strg2, child->GetChannelName());
+    char* name = NameIn(strg2, child->GetChannelName());
     if (SameGuid(kind, kStringChannelGuid)) {
       auto* text = static_cast<Lum_StringChannel*>(child);
       if (write) {

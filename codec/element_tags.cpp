@@ -1,17 +1,17 @@
 // The tags of a directory entry and the typed data elements, each serving both directions: one
 // walk writes them and reads them back with the same calls.
+#include <algorithm>
 #include <cstring>
 
 #include "codec/number_format.h"
 #include "codec/number_scan.h"
+#include "codec/pattern_search.h"
+#include "codec/white_space.h"
 #include "plugin/data_package.h"
 
 namespace {
 
-constexpr std::string_view kVectorFormat = "%f %f %f";
-constexpr std::string_view kMatrixFormat = "%f %f %f %f, %f %f %f %f, %f %f %f %f, %f %f %f %f";
-
-// Formats floats as the scan formats above read them back: a space between numbers, a comma
+// Formats floats as the readers take them back: a space between numbers, a comma
 // before the space that starts a new row of four.
 std::string_view FormatFloats(const float* values, int count, char* out) {
   char* end = out;
@@ -25,24 +25,60 @@ std::string_view FormatFloats(const float* values, int count, char* out) {
   return std::string_view(out, static_cast<std::size_t>(end - out));
 }
 
+// Reading, at `at` just after a typed element's opening tag: scans `count` numbers as "%f %f ..."
+// does, with a comma after every fourth of a matrix, and returns where the search for the ">"
+// that ends the element may start. What the scan matched holds no ">", so that is past it.
+const char* ScanNumbers(const char* at, const char* textEnd, int count, float* values) {
+  const char* end = at;
+  numbers::ScanFloatGroups(at, textEnd, count, count == 16 ? 4 : count, values, &end);
+  return end;
+}
+
+// The ">" of a tag when it stands within a few bytes of `from`, or null: then the reader's own
+// search, which remembers what it found, takes over.
+const char* NearbyClose(const char* from, const char* textEnd) {
+  constexpr std::ptrdiff_t kNearby = 32;
+  const char* const end = textEnd - from > kNearby ? from + kNearby : textEnd;
+  return pattern_search::Find(from, end, textEnd, ">");
+}
+
+// What TextBefore(">") and then MovePast(">") give from `from` when the ">" stands a few
+// bytes ahead: the tag's content, trimmed, and where the cursor ends, just past the ">". Null
+// when it stands further, and the reader's own searches take over.
+const char* NearbyTagEnd(const char* from, const char* textEnd, std::string_view& content) {
+  const char* const close = NearbyClose(from, textEnd);
+  if (!close) return nullptr;
+  const char* const begin = pattern_search::SkipWhiteSpace(from, close);
+  const char* end = close;
+  while (end > begin && IsWhiteSpaceChar(end[-1]))
+    --end;
+  content = std::string_view(begin, static_cast<std::size_t>(end - begin));
+  return close + 1;
+}
+
 }  // namespace
 
-bool Lum_DataPackage::XML_OpeningTag(const char* name) {
+bool Lum_DataPackage::XML_OpeningTag(char* name) {
   if (write) {
     AppendPieces({Newline(), Indentation(), "<", name, ">"});
   } else {
+    const std::string_view wanted(name);
     std::string_view content;
     do {
-      MoveCursorAfter("<");
-      content = TextBefore(">");
-      MoveCursorAfter(">");
-    } while (!content.empty() && !content.starts_with(name));
+      MovePast("<");
+      if (const char* after = NearbyTagEnd(bufferStart + bufferCursor, textEnd, content)) {
+        bufferCursor = static_cast<int>(after - bufferStart);
+      } else {
+        content = TextBefore(">");
+        MovePast(">");
+      }
+    } while (!content.empty() && !content.starts_with(wanted));
   }
   ++treeDepth;
   return true;
 }
 
-bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
+bool Lum_DataPackage::XML_OpeningIDTag(char* name, int id) {
   if (write) {
     char number[12];
     const std::string_view idText(number, numbers::FormatInt(id, number));
@@ -53,12 +89,18 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
   const int start = bufferCursor;
   const std::size_t nameLength = std::strlen(name);
   std::string_view head;  // the tag's content, cut to the name's length
+  const std::string_view wanted(name, nameLength);
   do {
-    MoveCursorAfter("<");
-    head = TextBefore(">").substr(0, nameLength);
-    MoveCursorAfter(">");
-  } while (id == 0 && !head.empty() && head != name);
-  if (head != name) {
+    MovePast("<");
+    if (const char* after = NearbyTagEnd(bufferStart + bufferCursor, textEnd, head)) {
+      bufferCursor = static_cast<int>(after - bufferStart);
+    } else {
+      head = TextBefore(">");
+      MovePast(">");
+    }
+    head = head.substr(0, nameLength);
+  } while (id == 0 && !head.empty() && head != wanted);
+  if (head != wanted) {
     bufferCursor = start;
     return false;
   }
@@ -66,18 +108,23 @@ bool Lum_DataPackage::XML_OpeningIDTag(const char* name, int id) {
   return true;
 }
 
-void Lum_DataPackage::XML_ClosingTag(const char* name) {
+void Lum_DataPackage::XML_ClosingTag(char* name) {
   --treeDepth;
   if (write) {
     AppendPieces({Newline(), Indentation(), "</", name, ">"});
     return;
   }
+  const std::string_view wanted(name);
   std::string_view content;
   do {
-    MoveCursorAfter("</");
-    content = TextBefore(">");
-    MoveCursorAfter(">");
-  } while (!content.empty() && content != name);
+    MovePast("</");
+    if (const char* after = NearbyTagEnd(bufferStart + bufferCursor, textEnd, content)) {
+      bufferCursor = static_cast<int>(after - bufferStart);
+    } else {
+      content = TextBefore(">");
+      MovePast(">");
+    }
+  } while (!content.empty() && content != wanted);
 }
 
 void Lum_DataPackage::WriteTypedElement(std::string_view name, std::string_view type,
@@ -90,72 +137,101 @@ void Lum_DataPackage::WriteTypedElement(std::string_view name, std::string_view 
 // after its opening tag; otherwise puts the cursor back and reports false.
 // A name that trimmed text can equal, and in which no "Type=" cuts the text short.
 bool Lum_DataPackage::IsPlainName(std::string_view name) {
-  return !name.empty() && name.size() < kTextLength && !IsWhiteSpace(name.front()) &&
-         !IsWhiteSpace(name.back()) && name.find("Type=") == std::string_view::npos;
+  if (name.empty() || name.size() >= kTextLength || IsWhiteSpaceChar(name.front()) ||
+      IsWhiteSpaceChar(name.back())) {
+    return false;
+  }
+  // Names are short: a byte at a time beats a call.
+  for (std::size_t i = 0; i + 5 <= name.size(); ++i) {
+    if (name[i] == 'T' && pattern_search::SameBytes(name.data() + i, "Type=", 5)) return false;
+  }
+  return true;
 }
 
 bool Lum_DataPackage::ReadTypedElementName(const char* name) {
   const int start = bufferCursor;
   const std::size_t length = std::strlen(name);
-  const char* const open = Find("<");
+  // Elements follow one another with only whitespace between them: a "<" after whitespace is
+  // the first one ahead.
+  const char* open = pattern_search::SkipWhiteSpace(bufferStart + start, textEnd);
+  if (open == textEnd || *open != '<') open = Find("<");
   if (open && IsPlainName(std::string_view(name, length))) {
     // The trimmed text between "<" and the first "Type=" equals such a name exactly when the name
     // stands right after the "<" and whitespace, followed by whitespace and "Type=": "Type=" can
     // neither start inside the name nor straddle its end. So it is compared where it stands.
-    const char* p = SkipWhiteSpace(open + 1);
+    const char* p = pattern_search::SkipWhiteSpace(open + 1, textEnd);
+    const char* const type =
+        pattern_search::SkipWhiteSpace(p + std::min(length, std::size_t(textEnd - p)), textEnd);
     const bool match = static_cast<std::size_t>(textEnd - p) >= length &&
-                       std::memcmp(p, name, length) == 0 &&
-                       std::string_view(SkipWhiteSpace(p + length), textEnd).starts_with("Type=");
-    bufferCursor = match ? static_cast<int>(p + length - bufferStart) : start;
-    if (match) MoveCursorAfter(">");
-    return match;
+                       pattern_search::SameBytes(p, name, length) &&
+                       std::string_view(type, textEnd).starts_with("Type=");
+    if (!match) {
+      bufferCursor = start;
+      return false;
+    }
+    // Neither the whitespace nor "Type=" holds the ">" that ends the tag.
+    if (const char* close = NearbyClose(type + 5, textEnd)) {
+      bufferCursor = static_cast<int>(close + 1 - bufferStart);
+    } else {
+      bufferCursor = static_cast<int>(p + length - bufferStart);
+      MovePast(">");
+    }
+    return true;
   }
-  MoveCursorAfter("<");
+  MovePast("<");
   CutStringBefore("Type=", tmp2);
-  MoveCursorAfter(">");
+  MovePast(">");
   if (std::strcmp(tmp2, name) == 0) return true;
   bufferCursor = start;
   return false;
 }
 
-void Lum_DataPackage::XML_StringTag(const char* name, char* text) {
+void Lum_DataPackage::XML_StringTag(char* name, char* text) {
   if (write) {
     WriteTypedElement(name, "Txt", text);
   } else if (ReadTypedElementName(name)) {
     CutStringBefore("</", text);
-    MoveCursorAfter(">");
+    MovePast(">");
   } else {
     text[0] = '\0';
   }
 }
 
-void Lum_DataPackage::XML_ValueTag(const char* name, float& value) {
+void Lum_DataPackage::XML_ValueTag(char* name, float& value) {
   if (write) {
     WriteTypedElement(name, "Val", FormatFloats(&value, 1, tmp2));
   } else if (ReadTypedElementName(name)) {
-    numbers::ScanFloat(bufferStart + bufferCursor, textEnd, value);
-    MoveCursorAfter(">");
+    if (const char* close =
+            NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 1, &value), textEnd)) {
+      bufferCursor = static_cast<int>(close + 1 - bufferStart);
+    } else {
+      MovePast(">");
+    }
   } else {
     value = 0.0f;
   }
 }
 
-void Lum_DataPackage::XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
+void Lum_DataPackage::XML_VectorTag(char* name, D3DXVECTOR3& vector) {
   float values[3] = {vector.x, vector.y, vector.z};
   if (write) {
     WriteTypedElement(name, "Vec", FormatFloats(values, 3, tmp2));
     return;
   }
   if (ReadTypedElementName(name)) {
-    numbers::ScanFloats(bufferStart + bufferCursor, textEnd, kVectorFormat, values);
-    MoveCursorAfter(">");
+    if (const char* close =
+            NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 3, values), textEnd)) {
+      bufferCursor = static_cast<int>(close + 1 - bufferStart);
+    } else {
+      MovePast(">");
+    }
   } else {
     values[0] = values[1] = values[2] = 0.0f;
   }
   vector = {values[0], values[1], values[2]};
 }
 
-void Lum_DataPackage::XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
+void Lum_DataPackage::XML_MatrixTag(char* name, D3DXMATRIX& matrix) {
   float values[16];
   std::memcpy(values, &matrix, sizeof(values));
   if (write) {
@@ -163,8 +239,12 @@ void Lum_DataPackage::XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
     return;
   }
   if (ReadTypedElementName(name)) {
-    numbers::ScanFloats(bufferStart + bufferCursor, textEnd, kMatrixFormat, values);
-    MoveCursorAfter(">");
+    if (const char* close =
+            NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 16, values), textEnd)) {
+      bufferCursor = static_cast<int>(close + 1 - bufferStart);
+    } else {
+      MovePast(">");
+    }
   } else {
     std::memset(values, 0, sizeof(values));
   }

@@ -3,21 +3,10 @@
 #include <algorithm>
 #include <cstring>
 
+#include "codec/cleanup.h"
 #include "plugin/data_package.h"
 
 namespace {
-
-// Marks a package operation as running for as long as it lives.
-class Operation {
- public:
-  Operation(bool& busy) : busy_(busy) { busy_ = true; }
-  ~Operation() { busy_ = false; }
-  Operation(const Operation&) = delete;
-  Operation& operator=(const Operation&) = delete;
-
- private:
-  bool& busy_;
-};
 
 // A missing buffer or a negative size holds nothing.
 unsigned int UsableSize(const char* buffer, int size) {
@@ -29,30 +18,38 @@ unsigned int UsableSize(const char* buffer, int size) {
 int Lum_DataPackage::WriteToBuffer(char* buffer, int size, bool newlineChoice, bool scramble) {
   // The state is shared: an operation started from inside another would wreck it.
   if (busy) return 0;
-  const Operation operation(busy);
+  busy = true;
   const unsigned int usable = UsableSize(buffer, size);
-  SetBuffer(buffer, usable);
-  write = true;
-  fileNoTxtChan = newlineChoice;
-  treeDepth = 0;
-  requiredSize = 1;
-  WriteHeader();
-  ReadWriteDirectory(false);
-  if (scramble) Encrypt(buffer, std::min(requiredSize, static_cast<int>(usable)));
+  RunThenCleanUp(
+      [&] {
+        SetBuffer(buffer, usable);
+        write = true;
+        fileNoTxtChan = newlineChoice;
+        treeDepth = 0;
+        requiredSize = 1;
+        WriteHeader();
+        ReadWriteDirectory(false);
+        if (scramble) Encrypt(buffer, std::min(requiredSize, static_cast<int>(usable)));
+      },
+      [] { busy = false; });
   return requiredSize;
 }
 
 int Lum_DataPackage::ReadFromBuffer(char* buffer, int size, bool newlineChoice, bool unscramble) {
   if (busy) return 0;
-  const Operation operation(busy);
+  busy = true;
   const unsigned int usable = UsableSize(buffer, size);
-  SetBuffer(buffer, usable);
-  write = false;
-  fileNoTxtChan = newlineChoice;
-  treeDepth = 0;
-  if (unscramble) Decrypt(buffer, static_cast<int>(usable));
-  EndTextAtNul();
-  ReadWriteDirectory(false);
+  RunThenCleanUp(
+      [&] {
+        SetBuffer(buffer, usable);
+        write = false;
+        fileNoTxtChan = newlineChoice;
+        treeDepth = 0;
+        if (unscramble) Decrypt(buffer, static_cast<int>(usable));
+        EndTextAtNul();
+        ReadWriteDirectory(false);
+      },
+      [] { busy = false; });
   return bufferCursor;
 }
 

@@ -46,26 +46,6 @@ std::size_t LayOut(const char* digits, int count, int exp10, char (&local)[24]) 
   return static_cast<std::size_t>(count + 1);
 }
 
-// Whether the seven digits D (last one 5, first at `exp10`) are the float's exact value, i.e. a
-// float holds D * 10^-j exactly. D is odd, so for j <= 0 that takes D * 5^-j < 2^24, and for j > 0
-// it takes 5^j dividing D (the rest of D is then below 2^24 anyway).
-bool IsExactTie(const char* digits, int exp10) {
-  const int j = kPrecision - exp10;
-  if (j > 10 || j < -2) return false;  // 5^11 exceeds seven digits; D * 5^3 exceeds 2^24
-  std::uint32_t d = 0;
-  for (int i = 0; i <= kPrecision; ++i)
-    d = d * 10 + static_cast<std::uint32_t>(digits[i] - '0');
-  if (j <= 0) {
-    for (int i = 0; i < -j; ++i)
-      d *= 5;
-    return d < (1u << 24);
-  }
-  std::uint32_t power = 1;
-  for (int i = 0; i < j; ++i)
-    power *= 5;
-  return d % power == 0;
-}
-
 constexpr char kDigitPairs[] =
     "00010203040506070809101112131415161718192021222324252627282930313233343536373839"
     "40414243444546474849505152535455565758596061626364656667686970717273747576777879"
@@ -116,6 +96,80 @@ bool SixDigits(float value, std::uint32_t& digits, int& exp10) {
   return digits >= 100000 && digits < 1000000;
 }
 
+// The six-digit rounding read off the float's exact decimal expansion, ties to even as printf
+// rounds: slow, but right for every value, subnormals and values next to a tie included.
+std::size_t FormatExactly(std::uint32_t magnitude, char (&local)[24]) {
+  std::uint32_t mantissa = magnitude & 0x7fffffu;
+  int exp2 = static_cast<int>(magnitude >> 23);
+  if (exp2 == 0) {
+    exp2 = 1;  // subnormal
+  } else {
+    mantissa |= 0x800000u;
+  }
+  exp2 -= 150;  // the value is mantissa * 2^exp2
+
+  // mantissa * 2^exp2, or mantissa * 5^-exp2 when the value is that times 10^exp2, in base 10^9,
+  // least significant limb first: at most 112 digits.
+  constexpr std::uint32_t kLimb = 1000000000u;
+  std::uint32_t limbs[14] = {mantissa % kLimb, mantissa / kLimb};
+  int size = 2;
+  const auto multiply = [&](std::uint32_t factor) {
+    std::uint64_t carry = 0;
+    for (int i = 0; i < size; ++i) {
+      const std::uint64_t product = std::uint64_t{limbs[i]} * factor + carry;
+      limbs[i] = static_cast<std::uint32_t>(product % kLimb);
+      carry = product / kLimb;
+    }
+    if (carry) limbs[size++] = static_cast<std::uint32_t>(carry);
+  };
+  for (int left = exp2; left > 0; left -= 29)
+    multiply(1u << (left < 29 ? left : 29));
+  for (int left = -exp2; left > 0; --left)
+    multiply(5);
+
+  char digits[128];
+  int count = 0;
+  while (size > 1 && limbs[size - 1] == 0)
+    --size;
+  for (int i = size - 1; i >= 0; --i) {
+    char limb[9];
+    for (int j = 8; j >= 0; --j, limbs[i] /= 10)
+      limb[j] = static_cast<char>('0' + limbs[i] % 10);
+    int first = 0;
+    if (count == 0) {
+      while (first < 8 && limb[first] == '0')
+        ++first;
+    }
+    std::memcpy(digits + count, limb + first, static_cast<std::size_t>(9 - first));
+    count += 9 - first;
+  }
+  int exp10 = count - 1 + (exp2 < 0 ? exp2 : 0);
+
+  if (count > kPrecision) {
+    const char next = digits[kPrecision];
+    bool rest = false;
+    for (int i = kPrecision + 1; i < count && !rest; ++i)
+      rest = digits[i] != '0';
+    const bool up = next > '5' || (next == '5' && (rest || (digits[kPrecision - 1] - '0') % 2));
+    count = kPrecision;
+    if (up) {
+      int i = kPrecision - 1;
+      while (i >= 0 && digits[i] == '9')
+        digits[i--] = '0';
+      if (i < 0) {
+        digits[0] = '1';
+        ++exp10;
+      } else {
+        ++digits[i];
+      }
+    }
+  }
+  while (digits[count - 1] == '0')
+    --count;
+  std::memset(digits + count, '0', 16);  // LayOut reads in chunks of eight
+  return LayOut(digits, count, exp10, local);
+}
+
 }  // namespace
 
 std::size_t FormatFloat(float value, char* out) {
@@ -151,67 +205,10 @@ std::size_t FormatFloat(float value, char* out) {
     return static_cast<std::size_t>(p - out) + length;
   }
 
-  // The shortest round-trip form S lies within half an ulp of the value, and no candidate with as
-  // few digits is closer. A normal float's half ulp is below half a unit in the sixth digit, so an
-  // S of up to six digits is already the six-digit rounding. A longer S rounds the same way as the
-  // value: a rounding boundary (seven digits) strictly between them would have been a shorter or
-  // closer candidate. That leaves S sitting exactly on a boundary, where only the exact value
-  // decides, and subnormals, whose ulp is too coarse; both take the slow route.
-  if (magnitude >= 0x00800000u) {
-    // "d[.dddddddd]e±XX" after one spare byte, so that moving the first digit onto the point
-    // leaves all digits contiguous. A normal float's exponent always has two digits.
-    char text[24];
-    const char* const end =
-        std::to_chars(text + 1, text + 16, abs_value, std::chars_format::scientific).ptr;
-    int exp10 = (end[-2] - '0') * 10 + (end[-1] - '0');
-    if (end[-3] == '-') exp10 = -exp10;
-    char* digits = text + 1;
-    int count = 1;
-    if (end - text > 6) {
-      text[2] = text[1];
-      digits = text + 2;
-      count = static_cast<int>(end - text) - 6;
-    }
-
-    bool exact_tie = false;
-    if (count > kPrecision) {
-      const char next = digits[kPrecision];
-      bool up = next > '5' || (next == '5' && count > kPrecision + 1);
-      if (next == '5' && count == kPrecision + 1) {
-        // S sits on a rounding boundary; round half to even if it is the exact value, as printf
-        // does, and otherwise let the exact value decide.
-        exact_tie = !IsExactTie(digits, exp10);
-        up = (digits[kPrecision - 1] - '0') % 2 != 0;
-      }
-      count = kPrecision;
-      if (up) {
-        int i = kPrecision - 1;
-        while (i >= 0 && digits[i] == '9')
-          --i;  // the nines become dropped trailing zeros
-        if (i < 0) {
-          digits[0] = '1';
-          count = 1;
-          ++exp10;
-        } else {
-          ++digits[i];
-          count = i + 1;
-        }
-      } else {
-        while (digits[count - 1] == '0')
-          --count;
-      }
-    }
-    if (!exact_tie) {
-      char local[24];
-      const std::size_t length = LayOut(digits, count, exp10, local);
-      std::memcpy(p, local, length);
-      return static_cast<std::size_t>(p - out) + length;
-    }
-  }
-  const char* const end = std::to_chars(p, out + kMaxFloatText, static_cast<double>(abs_value),
-                                        std::chars_format::general, kPrecision)
-                              .ptr;
-  return static_cast<std::size_t>(end - out);
+  char local[24];
+  const std::size_t length = FormatExactly(magnitude, local);
+  std::memcpy(p, local, length);
+  return static_cast<std::size_t>(p - out) + length;
 }
 
 std::size_t FormatInt(int value, char* out) {

@@ -5,6 +5,8 @@
 #include <cstdint>
 #include <system_error>
 
+#include <fast_float/fast_float.h>
+
 namespace numbers {
 namespace {
 
@@ -54,6 +56,24 @@ std::int64_t ReadExponent(const char* p, const char* end) {
     if (exponent < kExponentCap) exponent = exponent * 10 + (*p - '0');
   }
   return negative ? -exponent : exponent;
+}
+
+// std::from_chars for floats, which not every C++ library the plug-in is built with provides:
+// correctly rounded, with the same results and errors on every build. A value beyond the float
+// range, or a nonzero one below it, is out of range, and the value is then left alone.
+std::from_chars_result FloatFromChars(const char* first, const char* last, float& value) {
+  float parsed;
+  const auto [end, error] = fast_float::from_chars(first, last, parsed);
+  if (error != std::errc()) return {end, error};
+  const auto magnitude = std::bit_cast<std::uint32_t>(parsed) & 0x7fffffffu;
+  bool outOfRange = magnitude == 0x7f800000u;
+  if (magnitude == 0) {
+    for (const char* p = first; p != end && Lower(*p) != 'e'; ++p)
+      outOfRange = outOfRange || (*p >= '1' && *p <= '9');
+  }
+  if (outOfRange) return {end, std::errc::result_out_of_range};
+  value = parsed;
+  return {end, error};
 }
 
 // For a decimal that from_chars found out of range: true when it is huge rather than tiny.
@@ -131,7 +151,7 @@ bool InDroppedBitBand(std::uint32_t magnitude) {
 // Converts an unsigned decimal as strtof does: the longest valid prefix of [p, end).
 bool DecimalToBits(const char* p, const char* end, std::uint32_t& bits) {
   float value;
-  const auto [parsed_end, error] = std::from_chars(p, end, value);
+  const auto [parsed_end, error] = FloatFromChars(p, end, value);
   if (error == std::errc::invalid_argument) return false;
   if (error == std::errc::result_out_of_range) {
     bits = IsHuge(p, parsed_end) ? kInfinityBits : 0;
@@ -329,7 +349,7 @@ const char* ScanFloat(const char* first, const char* last, float& value) {
   if (IsDigit(c) || c == '.') {
     if (const char* end = ScanShortDecimal(digits, last, *p == '-', value)) return end;
     float parsed;
-    const auto [end, error] = std::from_chars(digits, last, parsed);
+    const auto [end, error] = FloatFromChars(digits, last, parsed);
     if (error == std::errc()) {
       const char stop = Lower(At(end, last));
       const auto bits = std::bit_cast<std::uint32_t>(parsed);
@@ -361,6 +381,23 @@ int ScanFloats(const char* first, const char* last, std::string_view format, flo
       ++p;
     }
   }
+  return stored;
+}
+
+int ScanFloatGroups(const char* first, const char* last, int count, int group, float* values,
+                    const char** end) {
+  int stored = 0;
+  const char* p = first;
+  while (const char* const scanned = ScanFloat(p, last, values[stored])) {
+    p = scanned;
+    if (++stored == count) break;
+    if (stored % group == 0) {
+      if (At(p, last) != ',') break;
+      ++p;
+    }
+    p = SkipSpace(p, last);
+  }
+  *end = p;
   return stored;
 }
 

@@ -17,4 +17,11 @@ const char* ScanFloat(const char* first, const char* last, float& value);
 // untouched. A '%' followed by anything but 'f' stops the scan there.
 int ScanFloats(const char* first, const char* last, std::string_view format, float* values);
 
+// ScanFloats for the formats of `count` "%f" separated by spaces, with a comma directly after
+// every `group`-th but the last: "%f", "%f %f %f" (group 3) and the matrix's sixteen in rows of
+// four. The same values and count, without reading the format; `end` receives where the scan
+// stopped: past everything the format matched.
+int ScanFloatGroups(const char* first, const char* last, int count, int group, float* values,
+                    const char** end);
+
 }  // namespace numbers

@@ -4,6 +4,8 @@
 #include <climits>
 #include <cstring>
 
+#include "codec/pattern_search.h"
+#include "codec/white_space.h"
 #include "plugin/data_package.h"
 
 namespace {
@@ -37,27 +39,26 @@ Lum_DataPackage::DelimiterMemo* Lum_DataPackage::MemoFor(std::string_view patter
 // that mostly move forward; remembering the last answer for each keeps a missing or far delimiter
 // from being searched for over and over.
 const char* Lum_DataPackage::Find(std::string_view pattern) {
-  constexpr std::ptrdiff_t kNear = 64;
+  constexpr std::ptrdiff_t kNear = 16;
   const char* const from = bufferStart + bufferCursor;
+  if (pattern.size() == 1) {
+    if (const char* found = pattern_search::FindInNextSixteen(from, textEnd, pattern[0])) {
+      return found;
+    }
+  }
   if (static_cast<std::size_t>(textEnd - from) < pattern.size()) return nullptr;
   const char* const lastStart = textEnd - pattern.size() + 1;
-  // The first occurrence in [p, end), or null.
-  const auto search = [pattern](const char* p, const char* end) -> const char* {
-    while (p < end) {
-      p = static_cast<const char*>(std::memchr(p, pattern[0], static_cast<std::size_t>(end - p)));
-      if (!p || std::equal(pattern.begin() + 1, pattern.end(), p + 1)) return p;
-      ++p;
-    }
-    return nullptr;
-  };
   const char* const nearEnd = from + std::min(kNear, lastStart - from);
-  if (const char* found = search(from, nearEnd)) return found;
+  if (const char* found = pattern_search::Find(from, nearEnd, textEnd, pattern)) return found;
 
   DelimiterMemo* memo = MemoFor(pattern);
   if (memo && memo->from <= bufferCursor && (memo->found < 0 || bufferCursor <= memo->found)) {
     return memo->found < 0 ? nullptr : bufferStart + memo->found;
   }
-  const char* const found = search(nearEnd, lastStart);
+  constexpr std::ptrdiff_t kFar = 256;
+  const char* const farEnd = nearEnd + std::min(kFar, lastStart - nearEnd);
+  const char* found = pattern_search::Find(nearEnd, farEnd, textEnd, pattern);
+  if (!found) found = pattern_search::FindFar(farEnd, lastStart, pattern);
   if (memo) *memo = {bufferCursor, found ? static_cast<int>(found - bufferStart) : -1};
   return found;
 }
@@ -69,7 +70,9 @@ void Lum_DataPackage::ForgetSearches() {
   ++readSerial;
 }
 
-void Lum_DataPackage::MoveCursorAfter(std::string_view pattern) {
+void Lum_DataPackage::MoveCursorAfter(const char* pattern) { MovePast(pattern); }
+
+void Lum_DataPackage::MovePast(std::string_view pattern) {
   if (const char* found = Find(pattern)) {
     bufferCursor = static_cast<int>(found - bufferStart + pattern.size());
   }
@@ -93,9 +96,9 @@ void Lum_DataPackage::CutStringBefore(std::string_view delimiter, char* text) {
 std::string_view Lum_DataPackage::TextBefore(std::string_view delimiter) {
   const char* end = Find(delimiter);
   if (!end) return {};
-  const char* const begin = SkipWhiteSpace(bufferStart + bufferCursor);
+  const char* const begin = pattern_search::SkipWhiteSpace(bufferStart + bufferCursor, textEnd);
   bufferCursor = static_cast<int>(begin - bufferStart);
-  while (end > begin && IsWhiteSpace(end[-1]))
+  while (end > begin && IsWhiteSpaceChar(end[-1]))
     --end;
   const std::size_t length = static_cast<std::size_t>(end - begin);
   if (length == 0 || length >= kTextLength) return {};
@@ -104,16 +107,12 @@ std::string_view Lum_DataPackage::TextBefore(std::string_view delimiter) {
 }
 
 const char* Lum_DataPackage::SkipWhiteSpace(const char* p) {
-  while (p < textEnd && IsWhiteSpace(*p))
-    ++p;
-  return p;
+  return pattern_search::SkipWhiteSpace(p, textEnd);
 }
 
-bool Lum_DataPackage::IsWhiteSpace(char c) {
-  return c == '\r' || c == '\n' || c == '\t' || c == ' ';
-}
+bool Lum_DataPackage::IsWhiteSpace(char c) { return IsWhiteSpaceChar(c); }
 
-bool Lum_DataPackage::MoveCursorBeforeTag(const char* name) {
+bool Lum_DataPackage::MoveCursorBeforeTag(char* name) {
   int unknown = INT_MAX;
   return SearchTag(name, unknown);
 }
@@ -138,7 +137,7 @@ bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
   int secondTag = -1;
   for (bool first = true;; first = false) {
     const int before = bufferCursor;
-    MoveCursorAfter("<");
+    MovePast("<");
     const int tag = bufferCursor - 1;
     if (bufferCursor == before || bufferStart + bufferCursor >= textEnd ||
         (!first && tag >= failsFrom)) {
@@ -153,7 +152,7 @@ bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
     if (!found) {
       // The name followed by an id attribute: cut at the whitespace before the first 'id="'.
       if (std::size_t id = content.find(kIdAttribute); id != std::string_view::npos) {
-        while (id > 0 && IsWhiteSpace(content[id - 1]))
+        while (id > 0 && IsWhiteSpaceChar(content[id - 1]))
           --id;
         found = content.substr(0, id) == name;
       }
@@ -165,10 +164,11 @@ bool Lum_DataPackage::SearchTag(const char* name, int& failsFrom) {
   }
 }
 
-int Lum_DataPackage::GetItemType(const char* name) {
+int Lum_DataPackage::GetItemType(char* name) {
   const int start = bufferCursor;
   const auto skipWhiteSpace = [] {
-    bufferCursor = static_cast<int>(SkipWhiteSpace(bufferStart + bufferCursor) - bufferStart);
+    bufferCursor = static_cast<int>(
+        pattern_search::SkipWhiteSpace(bufferStart + bufferCursor, textEnd) - bufferStart);
   };
   const auto rest = [] {
     const char* here = bufferStart + bufferCursor;
@@ -179,7 +179,7 @@ int Lum_DataPackage::GetItemType(const char* name) {
   };
 
   int type = 0;
-  MoveCursorAfter("<");
+  MovePast("<");
   skipWhiteSpace();
   const std::size_t nameLength = std::strlen(name);
   if (StartsWith(rest(), name) && rest().size() > nameLength) {

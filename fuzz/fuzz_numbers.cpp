@@ -51,6 +51,16 @@ void CheckScan(const std::string& text, int format) {
   }
   for (int i = 0; i < 16; ++i)
     Check(SameFloat(ours[i], expected[i]), "a value scanned differs");
+  // The readers' own entry point, without the format.
+  static constexpr int kCounts[] = {1, 3, 16};
+  float grouped[16] = {};
+  const char* end = nullptr;
+  const int stored =
+      numbers::ScanFloatGroups(text.data(), text.data() + text.size(), kCounts[format],
+                               format == 2 ? 4 : kCounts[format], grouped, &end);
+  Check(stored == (count < 0 ? 0 : count), "ScanFloatGroups stores another count than sscanf");
+  for (int i = 0; i < 16; ++i)
+    Check(SameFloat(grouped[i], expected[i]), "a value ScanFloatGroups scanned differs");
 }
 
 }  // namespace

@@ -15,12 +15,6 @@ ChannelType::ChannelType() : typeName{}, typeGuid{}, baseTypeGuid{}, typeCode(0)
   std::memset(engineFlags, kEngineFlagsMark, sizeof(engineFlags));
 }
 
-ChildCreation::ChildCreation()
-    : linkCode(-1), flagA(0), flagB(0), linkName{}, auxGuid{}, auxValue(0), linkMode(1) {
-  childType.typeGuid = kAllSupportedTypesGuid;
-  childType.baseTypeGuid = kAllSupportedTypesGuid;
-}
-
 ChannelType MakeChannelType(const char* name, const GUID& typeGuid, const GUID& baseTypeGuid,
                             std::int32_t typeCode) {
   ChannelType type;

@@ -9,9 +9,9 @@
 #include "host/export.h"
 #include "host/guid.h"
 
-struct TESSEL_API ChannelType {
+struct ChannelType {
   // Fills the engine's own bytes with their marks and leaves names and GUIDs zero.
-  ChannelType();
+  TESSEL_API ChannelType();
 
   char typeName[80];
   GUID typeGuid;
@@ -21,9 +21,15 @@ struct TESSEL_API ChannelType {
   std::uint8_t engineFlags[8];
 };
 
-struct TESSEL_API ChildCreation {
+// Plug-ins build these themselves: the default constructor is part of the declarations they
+// compile against, not of the engine library.
+struct ChildCreation {
   // A link that takes any type, under no name, with the engine's default codes.
-  ChildCreation();
+  ChildCreation()
+      : linkCode(-1), flagA(0), flagB(0), linkName{}, auxGuid{}, auxValue(0), linkMode(1) {
+    childType.typeGuid = kAllSupportedTypesGuid;
+    childType.baseTypeGuid = kAllSupportedTypesGuid;
+  }
 
   ChannelType childType;
   std::int32_t linkCode;

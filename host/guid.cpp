@@ -1,12 +1,26 @@
 #include "host/guid.h"
 
-#include <cstdio>
+namespace {
+
+void AppendHex(std::string& text, unsigned value, int digits) {
+  static constexpr char kDigits[] = "0123456789ABCDEF";
+  for (int shift = 4 * (digits - 1); shift >= 0; shift -= 4)
+    text += kDigits[(value >> shift) & 0xF];
+}
+
+}  // namespace
 
 std::string GuidToString(const GUID& guid) {
-  char text[37];
-  std::snprintf(text, sizeof(text), "%08X-%04X-%04X-%02X%02X-%02X%02X%02X%02X%02X%02X",
-                static_cast<unsigned>(guid.Data1), guid.Data2, guid.Data3, guid.Data4[0],
-                guid.Data4[1], guid.Data4[2], guid.Data4[3], guid.Data4[4], guid.Data4[5],
-                guid.Data4[6], guid.Data4[7]);
+  std::string text;
+  AppendHex(text, static_cast<unsigned>(guid.Data1), 8);
+  text += '-';
+  AppendHex(text, guid.Data2, 4);
+  text += '-';
+  AppendHex(text, guid.Data3, 4);
+  text += '-';
+  for (int i = 0; i < 8; ++i) {
+    if (i == 2) text += '-';
+    AppendHex(text, guid.Data4[i], 2);
+  }
   return text;
 }

@@ -2,8 +2,7 @@
 // derive from it; the engine owns every channel and destroys it through the virtual destructor.
 #pragma once
 
-#include <string>
-#include <vector>
+#include <cstddef>
 
 #include "host/channel_type.h"
 #include "host/export.h"
@@ -36,14 +35,15 @@ class TESSEL_API Vorn_Channel {
   virtual void DoDependencyInit(Vorn_List* list);
   virtual void CheckIndexNrRemoval(int index);
 
-  // Called by channel plug-ins.
+  // Called by channel plug-ins. Their signatures are the engine's, const and all: a plug-in finds
+  // them in the engine library by their decorated names.
   void SetChannelName(const char* name);
-  const char* GetChannelName() const;
+  const char* GetChannelName();
   void SetChildCreationCount(int count);
   void SetChildCreateType(ChildCreation record, int link);
-  Vorn_Channel* GetChild(int link) const;
-  Vorn_Channel* GetChildFromLinkPosition(int link, int position) const;
-  int GetChildLinkPositionCount(int link) const;
+  Vorn_Channel* GetChild(int link);
+  Vorn_Channel* GetChildFromLinkPosition(int link, int position);
+  int GetChildLinkPositionCount(int link);
 
   // Engine side: building trees and inspecting declarations.
   // Both refuse, changing nothing, a link never declared, a negative position and a child whose
@@ -57,20 +57,17 @@ class TESSEL_API Vorn_Channel {
 
   static int GetLiveChannelCount();
 
+  // A plug-in allocates its channels with the size these declarations give, and the engine's own
+  // constructor fills the base part: the real engine's data must fit. Room for several fixed
+  // 2048-character fields, the style of the plug-ins' own records, and link tables besides.
+  static constexpr std::size_t kDataBytes = 8192;
+
  private:
-  struct Link {
-    bool declared = false;
-    ChildCreation record;
-    std::vector<Vorn_Channel*> positions;  // not owned; null marks an empty position
-  };
-
-  const Link* FindLink(int link) const;
-  bool Admits(int link, Vorn_Channel* child) const;
-
-  std::string name_;
-  ChannelType type_;
-  int childCreationCount_ = 0;
-  std::vector<Link> links_;
-  unsigned long timeStamp_ = 0;
-  int interfaceType_ = 0;
+  struct State;
+  // The stand-in keeps its state elsewhere; nothing but this pointer lives in the room.
+  State* state_;
+  [[maybe_unused]] unsigned char reserved_[kDataBytes - sizeof(State*)];
 };
+
+static_assert(sizeof(Vorn_Channel) == sizeof(void*) + Vorn_Channel::kDataBytes,
+              "the table pointer and the engine's room, nothing else");

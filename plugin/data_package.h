@@ -44,19 +44,23 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   int ReadFromBuffer(char* buffer, int size, bool newlineChoice, bool unscramble);
   void WriteHeader();
   int ReadWriteDirectory(bool unused);
-  static void Encrypt(char* data, int length);
-  static void Decrypt(char* data, int length);
+  void Encrypt(char* data, int length);
+  void Decrypt(char* data, int length);
 
  private:
   friend class DataPackageTestAccess;
 
+  // The members below are exported with the class, and plug-ins built against these
+  // declarations find them by their decorated names: their signatures stay as they are. Members
+  // that only help them are static and take standard types.
+
   // Package buffer and cursor.
-  static void SetBuffer(char* buffer, unsigned int size);
+  void SetBuffer(char* buffer, unsigned int size);
+  int BufferAppend(int length);
+  const char* GetTabs();
+  const char* GetNewline();
   static void EndTextAtNul();
-  static int BufferAppend(int length);
   static void AppendPieces(std::initializer_list<std::string_view> pieces);
-  static const char* GetTabs();
-  static const char* GetNewline();
   static std::string_view Newline();
   static std::string_view Indentation();
 
@@ -65,24 +69,25 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   static DelimiterMemo* MemoFor(std::string_view pattern);
   static const char* Find(std::string_view pattern);
   static void ForgetSearches();
-  static void MoveCursorAfter(std::string_view pattern);
-  static char* GetStringBefore(const char* delimiter);
+  void MoveCursorAfter(const char* pattern);
+  char* GetStringBefore(const char* delimiter);
+  bool IsWhiteSpace(char c);
+  bool MoveCursorBeforeTag(char* name);
+  int GetItemType(char* name);
+  static void MovePast(std::string_view pattern);
   static void CutStringBefore(std::string_view delimiter, char* text);
   static std::string_view TextBefore(std::string_view delimiter);
-  static bool IsWhiteSpace(char c);
   static const char* SkipWhiteSpace(const char* p);
-  static bool MoveCursorBeforeTag(const char* name);
   static bool SearchTag(const char* name, int& failsFrom);
-  static int GetItemType(const char* name);
 
   // Element tags.
-  static bool XML_OpeningTag(const char* name);
-  static bool XML_OpeningIDTag(const char* name, int id);
-  static void XML_ClosingTag(const char* name);
-  static void XML_StringTag(const char* name, char* text);
-  static void XML_ValueTag(const char* name, float& value);
-  static void XML_VectorTag(const char* name, D3DXVECTOR3& vector);
-  static void XML_MatrixTag(const char* name, D3DXMATRIX& matrix);
+  bool XML_OpeningTag(char* name);
+  bool XML_OpeningIDTag(char* name, int id);
+  void XML_ClosingTag(char* name);
+  void XML_StringTag(char* name, char* text);
+  void XML_ValueTag(char* name, float& value);
+  void XML_VectorTag(char* name, D3DXVECTOR3& vector);
+  void XML_MatrixTag(char* name, D3DXMATRIX& matrix);
   static void WriteTypedElement(std::string_view name, std::string_view type,
                                 std::string_view value);
   static bool ReadTypedElementName(const char* name);
@@ -103,7 +108,7 @@ class DATA_DIRECTORY_API Lum_DataPackage : public Lum_StringChannel {
   char tagName[kTextLength] = {};
 
   // One package operation at a time, shared by every DataDirectory in the process.
-  static char* bufferStart;
+  static const char* bufferStart;
   static const char* bufferEnd;
   static const char* textEnd;  // reading: bufferEnd, or the first NUL before it
   static int bufferCursor;     // distance from bufferStart; while writing it may pass bufferEnd

@@ -28,7 +28,31 @@ VORN_EXPORT ChannelType* GetType() {
   return &typeRecord;
 }
 
-VORN_EXPORT Vorn_Channel* InitDLL() { return new (std::nothrow) Lum_DataPackage; }
+// Nothing may leave an extern "C" export: an exhausted allocator, here or in a base constructor
+// of the engine's, shows as null and frees what was taken.
+VORN_EXPORT Vorn_Channel* InitDLL() {
+  void* memory = ::operator new(sizeof(Lum_DataPackage), std::nothrow);
+  if (!memory) return nullptr;
+  Lum_DataPackage* channel = nullptr;
+#if defined(_MSC_VER)
+  // No C++ runtime here: a C++ exception is the structured exception with this code.
+  constexpr unsigned long kCppException = 0xE06D7363;
+  __try {
+    channel = new (memory) Lum_DataPackage;
+  } __except (GetExceptionCode() == kCppException ? EXCEPTION_EXECUTE_HANDLER
+                                                  : EXCEPTION_CONTINUE_SEARCH) {
+    channel = nullptr;
+  }
+#else
+  try {
+    channel = new (memory) Lum_DataPackage;
+  } catch (...) {
+    channel = nullptr;
+  }
+#endif
+  if (!channel) ::operator delete(memory);
+  return channel;
+}
 
 }  // extern "C"
 

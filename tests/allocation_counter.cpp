@@ -11,10 +11,7 @@
 #include <string>
 #include <vector>
 
-#define WIN32_LEAN_AND_MEAN
-#include <windows.h>
-// windows.h first: psapi.h needs its types.
-#include <psapi.h>
+#include "tests/import_table.h"
 #endif
 
 namespace {
@@ -23,6 +20,14 @@ std::atomic<std::size_t> allocations{0};
 std::atomic<std::size_t> liveBytes{0};
 std::atomic<std::size_t> peakBytes{0};
 std::atomic<bool> failNothrow{false};
+std::atomic<long> successesLeft{-1};  // -1: no limit
+
+bool Exhausted() {
+  long left = successesLeft.load();
+  while (left > 0 && !successesLeft.compare_exchange_weak(left, left - 1)) {
+  }
+  return left == 0;
+}
 
 std::size_t BlockSize(void* block) {
 #if defined(_WIN32)
@@ -89,58 +94,13 @@ std::vector<Replacement> Replacements() {
   };
 }
 
-std::vector<HMODULE> LoadedModules() {
-  std::vector<HMODULE> modules(64);
-  DWORD needed = 0;
-  for (;;) {
-    const DWORD size = static_cast<DWORD>(modules.size() * sizeof(HMODULE));
-    if (!EnumProcessModules(GetCurrentProcess(), modules.data(), size, &needed)) return {};
-    if (needed <= size) break;
-    modules.resize(needed / sizeof(HMODULE));
-  }
-  modules.resize(needed / sizeof(HMODULE));
-  return modules;
-}
-
-// Calls visit(name, slot) for every import by name of the module.
-template <typename Visit>
-void ForEachImport(HMODULE module, Visit visit) {
-  auto* base = reinterpret_cast<unsigned char*>(module);
-  const auto* dos = reinterpret_cast<const IMAGE_DOS_HEADER*>(base);
-  const auto* headers = reinterpret_cast<const IMAGE_NT_HEADERS*>(base + dos->e_lfanew);
-  const IMAGE_DATA_DIRECTORY& directory =
-      headers->OptionalHeader.DataDirectory[IMAGE_DIRECTORY_ENTRY_IMPORT];
-  if (!directory.VirtualAddress) return;
-  for (auto* library =
-           reinterpret_cast<const IMAGE_IMPORT_DESCRIPTOR*>(base + directory.VirtualAddress);
-       library->Name; ++library) {
-    if (!library->OriginalFirstThunk) continue;  // no name table to go by
-    auto* name = reinterpret_cast<const IMAGE_THUNK_DATA*>(base + library->OriginalFirstThunk);
-    auto* slot = reinterpret_cast<IMAGE_THUNK_DATA*>(base + library->FirstThunk);
-    for (; name->u1.AddressOfData; ++name, ++slot) {
-      if (IMAGE_SNAP_BY_ORDINAL(name->u1.Ordinal)) continue;
-      const auto* byName =
-          reinterpret_cast<const IMAGE_IMPORT_BY_NAME*>(base + name->u1.AddressOfData);
-      visit(reinterpret_cast<const char*>(byName->Name),
-            reinterpret_cast<void**>(&slot->u1.Function));
-    }
-  }
-}
-
-void WriteSlot(void** slot, void* value) {
-  DWORD protection;
-  VirtualProtect(slot, sizeof(void*), PAGE_READWRITE, &protection);
-  *slot = value;
-  VirtualProtect(slot, sizeof(void*), protection, &protection);
-}
-
 struct ShareReplacementsWithLoadedLibraries {
   ShareReplacementsWithLoadedLibraries() {
     const std::vector<Replacement> replacements = Replacements();
-    for (HMODULE module : LoadedModules()) {
-      ForEachImport(module, [&](const char* name, void** slot) {
+    for (HMODULE module : import_table::LoadedModules()) {
+      import_table::ForEachImport(module, [&](const char* name, void** slot) {
         for (const Replacement& replacement : replacements) {
-          if (replacement.name == name) WriteSlot(slot, replacement.function);
+          if (replacement.name == name) import_table::WriteSlot(slot, replacement.function);
         }
       });
     }
@@ -163,18 +123,21 @@ void Release(void* block) { ::Release(block); }
 FailNothrowAllocations::FailNothrowAllocations() { failNothrow = true; }
 FailNothrowAllocations::~FailNothrowAllocations() { failNothrow = false; }
 
+FailAllocationsAfter::FailAllocationsAfter(long successes) { successesLeft = successes; }
+FailAllocationsAfter::~FailAllocationsAfter() { successesLeft = -1; }
+
 }  // namespace allocation_counter
 
 // The program's replacements are the ones every library loaded into it uses as well.
 void* operator new(std::size_t size) {
-  if (void* block = Allocate(size)) return block;
+  if (void* block = Exhausted() ? nullptr : Allocate(size)) return block;
   throw std::bad_alloc();
 }
 
 void* operator new[](std::size_t size) { return ::operator new(size); }
 
 void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
-  return failNothrow ? nullptr : Allocate(size);
+  return failNothrow || Exhausted() ? nullptr : Allocate(size);
 }
 
 void* operator new[](std::size_t size, const std::nothrow_t& tag) noexcept {

@@ -32,4 +32,14 @@ class FailNothrowAllocations {
   FailNothrowAllocations& operator=(const FailNothrowAllocations&) = delete;
 };
 
+// While alive, allocations after the first `successes` fail, plain ones by throwing bad_alloc:
+// memory running out in the middle of a constructor.
+class FailAllocationsAfter {
+ public:
+  explicit FailAllocationsAfter(long successes);
+  ~FailAllocationsAfter();
+  FailAllocationsAfter(const FailAllocationsAfter&) = delete;
+  FailAllocationsAfter& operator=(const FailAllocationsAfter&) = delete;
+};
+
 }  // namespace allocation_counter

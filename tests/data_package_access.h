@@ -12,9 +12,15 @@ class DataPackageTestAccess {
 
   static char* TagName(Package& directory) { return directory.tagName; }
 
+  // The codec's members work on the state every DataDirectory shares: any one will do.
+  static Package& Any() {
+    static Package* const any = new Package;
+    return *any;
+  }
+
   // The state an entry point sets up before its walk.
   static void StartWriting(char* buffer, unsigned int size, bool lineFeeds = true) {
-    Package::SetBuffer(buffer, size);
+    Any().SetBuffer(buffer, size);
     Package::write = true;
     Package::fileNoTxtChan = lineFeeds;
     Package::treeDepth = 0;
@@ -22,7 +28,7 @@ class DataPackageTestAccess {
   }
   // Reads `text` as it stands, up to its NUL.
   static void StartReading(std::string& text) {
-    Package::SetBuffer(text.data(), static_cast<unsigned int>(text.size()));
+    Any().SetBuffer(text.data(), static_cast<unsigned int>(text.size()));
     Package::write = false;
     Package::treeDepth = 0;
     Package::EndTextAtNul();
@@ -35,32 +41,40 @@ class DataPackageTestAccess {
   static char* Tmp() { return Package::tmp; }
   static const char* BufferEnd() { return Package::bufferEnd; }
 
-  static int BufferAppend(int length) { return Package::BufferAppend(length); }
-  static const char* GetTabs() { return Package::GetTabs(); }
-  static const char* GetNewline() { return Package::GetNewline(); }
+  static int BufferAppend(int length) { return Any().BufferAppend(length); }
+  static const char* GetTabs() { return Any().GetTabs(); }
+  static const char* GetNewline() { return Any().GetNewline(); }
 
-  static void MoveCursorAfter(const char* pattern) { Package::MoveCursorAfter(pattern); }
+  static void MoveCursorAfter(const char* pattern) { Any().MoveCursorAfter(pattern); }
   static std::string GetStringBefore(const char* delimiter) {
-    return Package::GetStringBefore(delimiter);
+    return Any().GetStringBefore(delimiter);
   }
-  static bool IsWhiteSpace(char c) { return Package::IsWhiteSpace(c); }
-  static bool MoveCursorBeforeTag(const char* name) { return Package::MoveCursorBeforeTag(name); }
-  static int GetItemType(const char* name) { return Package::GetItemType(name); }
+  static bool IsWhiteSpace(char c) { return Any().IsWhiteSpace(c); }
+  static bool MoveCursorBeforeTag(const char* name) {
+    return Any().MoveCursorBeforeTag(const_cast<char*>(name));
+  }
+  static int GetItemType(const char* name) { return Any().GetItemType(const_cast<char*>(name)); }
   static bool SearchTag(const char* name, int& failsFrom) {
     return Package::SearchTag(name, failsFrom);
   }
 
-  static bool XML_OpeningTag(const char* name) { return Package::XML_OpeningTag(name); }
-  static bool XML_OpeningIDTag(const char* name, int id) {
-    return Package::XML_OpeningIDTag(name, id);
+  static bool XML_OpeningTag(const char* name) {
+    return Any().XML_OpeningTag(const_cast<char*>(name));
   }
-  static void XML_ClosingTag(const char* name) { Package::XML_ClosingTag(name); }
-  static void XML_StringTag(const char* name, char* text) { Package::XML_StringTag(name, text); }
-  static void XML_ValueTag(const char* name, float& value) { Package::XML_ValueTag(name, value); }
+  static bool XML_OpeningIDTag(const char* name, int id) {
+    return Any().XML_OpeningIDTag(const_cast<char*>(name), id);
+  }
+  static void XML_ClosingTag(const char* name) { Any().XML_ClosingTag(const_cast<char*>(name)); }
+  static void XML_StringTag(const char* name, char* text) {
+    Any().XML_StringTag(const_cast<char*>(name), text);
+  }
+  static void XML_ValueTag(const char* name, float& value) {
+    Any().XML_ValueTag(const_cast<char*>(name), value);
+  }
   static void XML_VectorTag(const char* name, D3DXVECTOR3& vector) {
-    Package::XML_VectorTag(name, vector);
+    Any().XML_VectorTag(const_cast<char*>(name), vector);
   }
   static void XML_MatrixTag(const char* name, D3DXMATRIX& matrix) {
-    Package::XML_MatrixTag(name, matrix);
+    Any().XML_MatrixTag(const_cast<char*>(name), matrix);
   }
 };

@@ -126,7 +126,7 @@ TEST(ScramblingTest, AmountsFollowTheWrappingRule) {
 
   const int length = 200000;
   std::vector<char> zeros(length, 0);
-  Lum_DataPackage::Encrypt(zeros.data(), length);
+  Access::Any().Encrypt(zeros.data(), length);
   for (int i = 0; i < length; ++i) {
     ASSERT_EQ(static_cast<std::uint8_t>(zeros[i]), static_cast<std::uint8_t>(Amount(i))) << i;
     if (i >= 12 && i <= 46340) {
@@ -135,10 +135,10 @@ TEST(ScramblingTest, AmountsFollowTheWrappingRule) {
   }
 
   char abc[] = "abc";
-  Lum_DataPackage::Encrypt(abc, 3);
+  Access::Any().Encrypt(abc, 3);
   EXPECT_STREQ(abc, "cce");
-  Lum_DataPackage::Encrypt(abc, 0);
-  Lum_DataPackage::Encrypt(abc, -4);
+  Access::Any().Encrypt(abc, 0);
+  Access::Any().Encrypt(abc, -4);
   EXPECT_STREQ(abc, "cce");
 }
 
@@ -149,11 +149,11 @@ TEST(ScramblingTest, DecryptUndoesEncryptAtEveryLength) {
     for (char& c : original)
       c = static_cast<char>(random());
     std::vector<char> data = original;
-    Lum_DataPackage::Encrypt(data.data(), length);
+    Access::Any().Encrypt(data.data(), length);
     if (length > 0) {
       EXPECT_NE(data, original) << length;
     }
-    Lum_DataPackage::Decrypt(data.data(), length);
+    Access::Any().Decrypt(data.data(), length);
     EXPECT_EQ(data, original) << length;
   }
 }
@@ -200,6 +200,29 @@ TEST(EntryPointsTest, OperationsStartedInsideAnotherChangeNothing) {
   expected.replace(expected.find("Bob"), 3, "Ann");
   expected.replace(expected.find("> 7 <"), 5, "> 12.5 <");
   EXPECT_EQ(package, expected);
+}
+
+// A channel's exception passes through the walk to the caller, and every later operation works
+// as if it had never happened.
+TEST(EntryPointsTest, AnExceptionFromAChannelLeavesLaterOperationsWhole) {
+  Players players;
+  Lum_DataPackage* sub = players.tree.SubDirectory(players.directory, "Sub");
+  players.tree.Text(sub, "Note", "deep");
+  bool throwing = true;
+  players.tree.CallEachIteration(sub, [&] {
+    if (throwing) throw 42;
+  });
+  std::string buffer(4096, '\0');
+  EXPECT_THROW(players.directory->WriteToBuffer(buffer.data(), 4096, true, false), int);
+  throwing = false;
+  const std::string package = WritePackage(*players.directory);
+  EXPECT_NE(package.find("<Note Type=\"Txt\"> deep </Note>"), std::string::npos);
+
+  throwing = true;
+  EXPECT_THROW(ReadPackage(*players.directory, package), int);
+  throwing = false;
+  EXPECT_EQ(ReadPackage(*players.directory, package), static_cast<int>(package.size()));
+  EXPECT_EQ(WritePackage(*players.directory), package);
 }
 
 }  // namespace

@@ -98,6 +98,14 @@ Outcome Ours(std::string_view text, std::string_view format) {
     outcome.stored = ScanFloats(text.data(), last, format, v);
   }
   std::memcpy(outcome.bits, v, sizeof v);
+  // The readers' own entry point must agree with the format.
+  const int count = format == "%f" ? 1 : format == kVector ? 3 : 16;
+  float grouped[16];
+  std::fill(std::begin(grouped), std::end(grouped), std::bit_cast<float>(kUntouched));
+  const char* end = nullptr;
+  EXPECT_EQ(ScanFloatGroups(text.data(), last, count, count == 16 ? 4 : count, grouped, &end),
+            outcome.stored);
+  EXPECT_EQ(std::memcmp(grouped, v, sizeof v), 0);
   return outcome;
 }
 
@@ -239,6 +247,33 @@ TEST(ScanFloatsTest, Formats) {
           i < c.stored ? std::bit_cast<std::uint32_t>(c.values[i]) : kUntouched;
       EXPECT_EQ(std::bit_cast<std::uint32_t>(values[i]), expected) << Escape(c.text) << " #" << i;
     }
+  }
+}
+
+// Readers go on from where the scan stopped: past everything the format matched, and no further.
+TEST(ScanFloatGroupsTest, StopsAfterWhatTheFormatMatched) {
+  const struct {
+    std::string_view text;
+    int count;
+    int stored;
+    int stop;
+  } kCases[] = {
+      {" 1 2.5 -3 </Pos>", 3, 3, 9},
+      {"1 2 x", 3, 2, 4},  // the whitespace before x matched
+      {"1 2 3 4 5", 16, 4, 7},
+      {"1 2 3 4,5 6 7 8,\t9 10 11 12, 13 14 15 16,", 16, 16, 40},
+      {"1e+ </V>", 1, 1, 3},
+      {"x", 1, 0, 0},
+      {"", 3, 0, 0},
+  };
+  for (const auto& c : kCases) {
+    float values[16];
+    const char* stop = nullptr;
+    EXPECT_EQ(ScanFloatGroups(c.text.data(), c.text.data() + c.text.size(), c.count,
+                              c.count == 16 ? 4 : c.count, values, &stop),
+              c.stored)
+        << Escape(c.text);
+    EXPECT_EQ(stop - c.text.data(), c.stop) << Escape(c.text);
   }
 }
 

@@ -108,4 +108,27 @@ TEST(InitDllTest, FailedAllocationGivesNullAndRunsNoConstructor) {
   EXPECT_EQ(engineCalls, 0);
 }
 
+// The engine's constructors throw when memory runs out; InitDLL must not let that through.
+TEST(InitDllTest, ConstructorsRunningOutOfMemoryGiveNullAndLeaveNothingBehind) {
+  const InitDllFunction initDll = plugins::DataDirectoryLibrary()->InitDllEntry();
+  int nulls = 0;
+  for (long successes = 0;; ++successes) {
+    const int liveBefore = Vorn_Channel::GetLiveChannelCount();
+    const std::size_t bytesBefore = allocation_counter::LiveBytes();
+    Vorn_Channel* channel;
+    {
+      allocation_counter::FailAllocationsAfter failing(successes);
+      channel = initDll();
+    }
+    if (channel) {
+      delete channel;
+      break;
+    }
+    ++nulls;
+    EXPECT_EQ(Vorn_Channel::GetLiveChannelCount(), liveBefore) << successes;
+    EXPECT_EQ(allocation_counter::LiveBytes(), bytesBefore) << successes;
+  }
+  EXPECT_GE(nulls, 3);  // its own allocation, then the engine's, then the string channel's
+}
+
 }  // namespace

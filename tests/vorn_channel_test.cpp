@@ -10,7 +10,7 @@ namespace {
 
 using Link = Lum_DataPackage::Link;
 
-int PositionCounts(const Vorn_Channel& channel) {
+int PositionCounts(Vorn_Channel& channel) {
   int total = 0;
   for (int link = -1; link < 8; ++link)
     total += channel.GetChildLinkPositionCount(link);

@@ -1,15 +1,36 @@
 #include "host/string_channel/string_channel.h"
 
+#include <string>
+#include <vector>
+
 #include "host/engine_trace.h"
 #include "host/guid.h"
 
-Lum_StringChannel::Lum_StringChannel() {
+struct Lum_StringChannel::State {
+  std::string text;
+  std::vector<unsigned short> wideText;  // NUL-terminated, made from text when asked for
+  bool wideTextCurrent = false;
+  bool singleLine = false;
+  bool useWideChars = false;
+  int maxChars = 0;
+  tagRECT lastRect{};
+  unsigned long textStamp = 0;
+};
+
+Lum_StringChannel::Lum_StringChannel() : state_(new State) {
   SetChannelType(MakeChannelType("Text", kStringChannelGuid, kStringChannelGuid, 1));
 }
 
-Lum_StringChannel::Lum_StringChannel(const Lum_StringChannel& other) = default;
-Lum_StringChannel& Lum_StringChannel::operator=(const Lum_StringChannel& other) = default;
-Lum_StringChannel::~Lum_StringChannel() = default;
+Lum_StringChannel::Lum_StringChannel(const Lum_StringChannel& other)
+    : Vorn_Channel(other), state_(new State(*other.state_)) {}
+
+Lum_StringChannel& Lum_StringChannel::operator=(const Lum_StringChannel& other) {
+  Vorn_Channel::operator=(other);
+  *state_ = *other.state_;
+  return *this;
+}
+
+Lum_StringChannel::~Lum_StringChannel() { delete state_; }
 
 bool Lum_StringChannel::SaveChannel(VornFileSaver& saver) {
   return Vorn_Channel::SaveChannel(saver);
@@ -20,35 +41,36 @@ bool Lum_StringChannel::LoadChannel(VornFileLoader& loader, Vorn_ChannelGroup* g
 }
 
 // A text channel changes when its text does.
-unsigned long Lum_StringChannel::GetTimeStamp() { return textStamp_; }
+unsigned long Lum_StringChannel::GetTimeStamp() { return state_->textStamp; }
 
-const char* Lum_StringChannel::GetString() { return text_.c_str(); }
+const char* Lum_StringChannel::GetString() { return state_->text.c_str(); }
 
 void Lum_StringChannel::SetString(const char* text) {
-  text_ = text ? text : "";
-  wideTextCurrent_ = false;
+  state_->text = text ? text : "";
+  state_->wideTextCurrent = false;
   SetTimeStamp();
-  textStamp_ = Vorn_Channel::GetTimeStamp();
-  TraceEngineCall(*this, "SetString", static_cast<int>(text_.size()));
+  state_->textStamp = Vorn_Channel::GetTimeStamp();
+  TraceEngineCall(*this, "SetString", static_cast<int>(state_->text.size()));
 }
 
-void Lum_StringChannel::SetSingeLine(bool singleLine) { singleLine_ = singleLine; }
-bool Lum_StringChannel::GetSingeLine() { return singleLine_; }
+void Lum_StringChannel::SetSingeLine(bool singleLine) { state_->singleLine = singleLine; }
+bool Lum_StringChannel::GetSingeLine() { return state_->singleLine; }
 
 // An editing hint for the engine's text fields; the text itself is never cut.
-void Lum_StringChannel::SetMaxCars(int maxChars) { maxChars_ = maxChars; }
+void Lum_StringChannel::SetMaxCars(int maxChars) { state_->maxChars = maxChars; }
 
-void Lum_StringChannel::SetIfUseWChar(bool useWideChars) { useWideChars_ = useWideChars; }
-bool Lum_StringChannel::GetIfUseWChar() { return useWideChars_; }
+void Lum_StringChannel::SetIfUseWChar(bool useWideChars) { state_->useWideChars = useWideChars; }
+bool Lum_StringChannel::GetIfUseWChar() { return state_->useWideChars; }
 
 // The wide text is made when first asked for: most texts are only ever read as 8-bit ones.
 const unsigned short* Lum_StringChannel::GetWString() {
-  if (!wideTextCurrent_) {
-    wideText_.assign(text_.size() + 1, 0);
-    AS2WS(wideText_.data(), text_.c_str());
-    wideTextCurrent_ = true;
+  State& state = *state_;
+  if (!state.wideTextCurrent) {
+    state.wideText.assign(state.text.size() + 1, 0);
+    AS2WS(state.wideText.data(), state.text.c_str());
+    state.wideTextCurrent = true;
   }
-  return wideText_.data();
+  return state.wideText.data();
 }
 
 void Lum_StringChannel::SetWString(const unsigned short* wide) {
@@ -75,5 +97,5 @@ void Lum_StringChannel::WS2AS(char* text, const unsigned short* wide) {
   text[i] = '\0';
 }
 
-tagRECT Lum_StringChannel::GetLastRect() { return lastRect_; }
-void Lum_StringChannel::SetLastRect(tagRECT rect) { lastRect_ = rect; }
+tagRECT Lum_StringChannel::GetLastRect() { return state_->lastRect; }
+void Lum_StringChannel::SetLastRect(tagRECT rect) { state_->lastRect = rect; }

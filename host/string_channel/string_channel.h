@@ -2,8 +2,7 @@
 // from it and inherit everything the engine does with a channel.
 #pragma once
 
-#include <string>
-#include <vector>
+#include <cstddef>
 
 #include "host/d3dx_types.h"
 #include "host/export.h"
@@ -41,13 +40,15 @@ class STRING_CHANNEL_API Lum_StringChannel : public Vorn_Channel {
   virtual tagRECT GetLastRect();
   virtual void SetLastRect(tagRECT rect);
 
+  // As for the engine's base: the real string channel's data must fit in what a DataDirectory
+  // allocates for it, and may hold its text in fixed 8- and 16-bit fields.
+  static constexpr std::size_t kDataBytes = 16384;
+
  private:
-  std::string text_;
-  std::vector<unsigned short> wideText_;  // NUL-terminated, made from text_ when asked for
-  bool wideTextCurrent_ = false;
-  bool singleLine_ = false;
-  bool useWideChars_ = false;
-  int maxChars_ = 0;
-  tagRECT lastRect_{};
-  unsigned long textStamp_ = 0;
+  struct State;
+  State* state_;
+  [[maybe_unused]] unsigned char reserved_[kDataBytes - sizeof(State*)];
 };
+
+static_assert(sizeof(Lum_StringChannel) == sizeof(Vorn_Channel) + Lum_StringChannel::kDataBytes,
+              "the engine's base and the string channel's room, nothing else");

@@ -53,8 +53,12 @@ Plugins LoadPlugins(const std::string& pluginDir) {
                     bool unscramble) {
     return directory->ReadFromBuffer(buffer, size, newline, unscramble);
   };
-  plugins.encrypt = &Lum_DataPackage::Encrypt;
-  plugins.decrypt = &Lum_DataPackage::Decrypt;
+  plugins.encrypt = [](Lum_DataPackage* directory, char* data, int length) {
+    directory->Encrypt(data, length);
+  };
+  plugins.decrypt = [](Lum_DataPackage* directory, char* data, int length) {
+    directory->Decrypt(data, length);
+  };
 #else
   // A member function takes its object as a first argument in this ABI.
   const auto find = [&](auto& entry, const char* name) {
@@ -71,6 +75,11 @@ Plugins LoadPlugins(const std::string& pluginDir) {
   find(plugins.decrypt, "_ZN15Lum_DataPackage7DecryptEPci");
 #endif
   return plugins;
+}
+
+Lum_DataPackage* Plugins::Scrambler() const {
+  if (!scrambler) scrambler = std::shared_ptr<Vorn_Channel>(directories->CreateChannel());
+  return static_cast<Lum_DataPackage*>(scrambler.get());
 }
 
 }  // namespace datapack

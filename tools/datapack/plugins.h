@@ -26,13 +26,16 @@ struct Plugins {
                      bool unscramble) const {
     return read(&directory, buffer, size, newlineChoice, unscramble);
   }
-  void Encrypt(char* data, int length) const { encrypt(data, length); }
-  void Decrypt(char* data, int length) const { decrypt(data, length); }
+  // Scrambling is a member too, though it uses no directory's state: any directory serves.
+  void Encrypt(char* data, int length) const { encrypt(Scrambler(), data, length); }
+  void Decrypt(char* data, int length) const { decrypt(Scrambler(), data, length); }
+  Lum_DataPackage* Scrambler() const;
 
   int (*write)(Lum_DataPackage*, char*, int, bool, bool) = nullptr;
   int (*read)(Lum_DataPackage*, char*, int, bool, bool) = nullptr;
-  void (*encrypt)(char*, int) = nullptr;
-  void (*decrypt)(char*, int) = nullptr;
+  void (*encrypt)(Lum_DataPackage*, char*, int) = nullptr;
+  void (*decrypt)(Lum_DataPackage*, char*, int) = nullptr;
+  mutable std::shared_ptr<Vorn_Channel> scrambler;  // made by the plug-in when first needed
 };
 
 // Where plug-ins are looked for, in order: beside the program's real path, the install layout's

@@ -1,0 +1,115 @@
+# Holds the DataDirectory DLL to the documented declarations: every name the reference object
+# (those declarations, compiled for the engine's ABI) imports is in the committed list, and the
+# list holds nothing else; the DLL exports every name of its own from the list, and imports only
+# from the list's other DLLs, msvcrt.dll and KERNEL32.dll.
+# cmake -DNM=<llvm-nm> -DOBJDUMP=<llvm-objdump> -DREFERENCE=<obj> -DNAMES=<list> -DLIBRARY=<dll>
+#       -P CheckAbi.cmake
+cmake_minimum_required(VERSION 3.25)
+
+set(plugin 3F1A9C42-7B05-4D2E-A6C3-58E0B91D47F6.dll)
+set(failures 0)
+macro(fail)
+  message(SEND_ERROR ${ARGN})
+  math(EXPR failures "${failures} + 1")
+endmacro()
+
+# The committed list: "<DLL> <decorated name>" a line.
+file(STRINGS ${NAMES} lines REGEX "^[^#]")
+set(listed)
+foreach(line IN LISTS lines)
+  string(REGEX MATCH "^([^ ]+) (.+)$" _ "${line}")
+  list(APPEND listed "${CMAKE_MATCH_2}")
+  list(APPEND "names_${CMAKE_MATCH_1}" "${CMAKE_MATCH_2}")
+endforeach()
+
+# Decorated names are full of characters CMake lists and regexes take for their own; compare
+# them through their hex spelling.
+function(hex_list out)
+  set(result)
+  foreach(name IN LISTS ARGN)
+    string(HEX "${name}" hex)
+    list(APPEND result ${hex})
+  endforeach()
+  set(${out} ${result} PARENT_SCOPE)
+endfunction()
+
+# 1. The reference object imports exactly the listed names (C names carry a leading underscore).
+execute_process(COMMAND ${NM} --undefined-only ${REFERENCE} OUTPUT_VARIABLE nm_output
+                COMMAND_ERROR_IS_FATAL ANY)
+string(REGEX MATCHALL "__imp_[^\n]+" imported "${nm_output}")
+set(referenced)
+foreach(name IN LISTS imported)
+  string(REGEX REPLACE "^__imp__?" "" name "${name}")
+  string(REGEX REPLACE "^_(GetType|InitDLL)$" "\\1" name "${name}")
+  list(APPEND referenced "${name}")
+endforeach()
+# The one name no call can reach: the table that an exported class exports with itself.
+list(APPEND referenced "??_7Lum_DataPackage@@6B@")
+hex_list(referenced_hex ${referenced})
+hex_list(listed_hex ${listed})
+foreach(name hex IN ZIP_LISTS referenced referenced_hex)
+  if(NOT hex IN_LIST listed_hex)
+    fail("declared but not listed in ${NAMES}: ${name}")
+  endif()
+endforeach()
+foreach(name hex IN ZIP_LISTS listed listed_hex)
+  if(NOT hex IN_LIST referenced_hex)
+    fail("listed but not declared: ${name}")
+  endif()
+endforeach()
+
+# 2. The DLL's tables.
+execute_process(COMMAND ${OBJDUMP} -p ${LIBRARY} OUTPUT_VARIABLE dump COMMAND_ERROR_IS_FATAL ANY)
+string(REPLACE ";" "\\;" dump "${dump}")
+string(REPLACE "\n" ";" dump_lines "${dump}")
+set(section "")
+set(exports)
+set(dll "")
+set(imported_dlls)
+foreach(line IN LISTS dump_lines)
+  if(line MATCHES "^The Import Tables")
+    set(section imports)
+  elseif(line MATCHES "^Export Table")
+    set(section exports)
+  elseif(section STREQUAL "imports" AND line MATCHES "DLL Name: (.+)$")
+    set(dll "${CMAKE_MATCH_1}")
+    list(APPEND imported_dlls "${dll}")
+  elseif(section STREQUAL "imports" AND dll AND line MATCHES "^ +[0-9]+  (.+)$")
+    list(APPEND "imports_${dll}" "${CMAKE_MATCH_1}")
+  elseif(section STREQUAL "exports" AND line MATCHES "^ +[0-9]+ +0x[0-9a-f]+  (.+)$")
+    list(APPEND exports "${CMAKE_MATCH_1}")
+  endif()
+endforeach()
+
+hex_list(exports_hex ${exports})
+hex_list(own_hex ${names_${plugin}})
+list(LENGTH own_hex own_count)
+foreach(name hex IN ZIP_LISTS names_${plugin} own_hex)
+  if(NOT hex IN_LIST exports_hex)
+    fail("${plugin} does not export the listed name ${name}")
+  endif()
+endforeach()
+
+foreach(dll IN LISTS imported_dlls)
+  if(dll STREQUAL "msvcrt.dll" OR dll STREQUAL "KERNEL32.dll")
+    continue()
+  endif()
+  if(NOT DEFINED "names_${dll}")
+    fail("${plugin} imports from ${dll}, which it must not")
+    continue()
+  endif()
+  hex_list(allowed_hex ${names_${dll}})
+  foreach(name IN LISTS "imports_${dll}")
+    string(HEX "${name}" hex)
+    if(NOT hex IN_LIST allowed_hex)
+      fail("${plugin} imports from ${dll} a name the engine does not export: ${name}")
+    endif()
+  endforeach()
+endforeach()
+
+list(LENGTH exports export_count)
+message("${plugin}: ${export_count} exports, ${own_count} of them listed; imports from "
+        "${imported_dlls}")
+if(failures)
+  message(FATAL_ERROR "${failures} differences from the documented declarations")
+endif()

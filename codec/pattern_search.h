@@ -1,0 +1,110 @@
+// Finding the reader's delimiters, sixteen bytes at a step where the processor has SSE2 (every
+// x86 target the plug-in is built for), a byte at a step elsewhere.
+#pragma once
+
+#include <cstddef>
+#include <cstring>
+#include <string_view>
+
+#include "codec/white_space.h"
+
+#if defined(__SSE2__) || defined(_M_X64) || (defined(_M_IX86_FP) && _M_IX86_FP >= 2)
+#define PACKAGE_SEARCH_SSE2 1
+#include <emmintrin.h>
+#if defined(_MSC_VER) && !defined(__clang__)
+#include <intrin.h>
+#endif
+#endif
+
+namespace pattern_search {
+
+#if defined(PACKAGE_SEARCH_SSE2)
+
+inline unsigned LowestBit(unsigned mask) {
+#if defined(_MSC_VER) && !defined(__clang__)
+  unsigned long index;
+  _BitScanForward(&index, mask);
+  return static_cast<unsigned>(index);
+#else
+  return static_cast<unsigned>(__builtin_ctz(mask));
+#endif
+}
+
+#endif
+
+inline const char* SkipWhiteSpace(const char* p, const char* end) {
+  while (p < end && IsWhiteSpaceChar(*p))
+    ++p;
+  return p;
+}
+
+// The bytes after the first one match the rest of the pattern.
+inline bool RestMatches(const char* p, std::string_view pattern) {
+  for (std::size_t i = 1; i < pattern.size(); ++i) {
+    if (p[i] != pattern[i]) return false;
+  }
+  return true;
+}
+
+// The first occurrence starting in [p, end) when it may lie far ahead: the C library's memchr
+// outruns any loop here over long stretches. The pattern must end before the text does.
+inline const char* FindFar(const char* p, const char* end, std::string_view pattern) {
+  while (p < end) {
+    p = static_cast<const char*>(std::memchr(p, pattern[0], static_cast<std::size_t>(end - p)));
+    if (!p || RestMatches(p, pattern)) return p;
+    ++p;
+  }
+  return nullptr;
+}
+
+// The first occurrence of `pattern` starting in [p, end), or null. Every byte of an occurrence
+// that starts before `end` lies before `readable`, and nothing at or after `readable` is read:
+// callers pass end <= readable - pattern.size() + 1.
+inline const char* Find(const char* p, const char* end, const char* readable,
+                        std::string_view pattern) {
+#if defined(PACKAGE_SEARCH_SSE2)
+  const __m128i first = _mm_set1_epi8(pattern[0]);
+  while (p < end && readable - p >= 16) {
+    const __m128i block = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+    unsigned mask = static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(block, first)));
+    if (end - p < 16) mask &= (1u << (end - p)) - 1;
+    while (mask != 0) {
+      const char* candidate = p + LowestBit(mask);
+      if (RestMatches(candidate, pattern)) return candidate;
+      mask &= mask - 1;
+    }
+    p += 16;
+  }
+  for (; p < end; ++p) {
+    if (*p == pattern[0] && RestMatches(p, pattern)) return p;
+  }
+  return nullptr;
+#else
+  (void)readable;
+  return FindFar(p, end, pattern);
+#endif
+}
+
+// The first `c` among the sixteen bytes from p, or null when they hold none or the text ends
+// before them.
+inline const char* FindInNextSixteen(const char* p, const char* readable, char c) {
+  if (readable - p < 16) return nullptr;
+#if defined(PACKAGE_SEARCH_SSE2)
+  const __m128i block = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+  const unsigned mask =
+      static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(block, _mm_set1_epi8(c))));
+  return mask != 0 ? p + LowestBit(mask) : nullptr;
+#else
+  return static_cast<const char*>(std::memchr(p, c, 16));
+#endif
+}
+
+// Whether [p, p + length) holds `text`.
+inline bool SameBytes(const char* p, const char* text, std::size_t length) {
+  for (std::size_t i = 0; i < length; ++i) {
+    if (p[i] != text[i]) return false;
+  }
+  return true;
+}
+
+}  // namespace pattern_search

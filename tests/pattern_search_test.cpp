@@ -1,0 +1,76 @@
+// The reader's delimiter searches against a byte-by-byte search, on texts that end right before
+// an inaccessible page: a search that reads one byte too far faults.
+#include "codec/pattern_search.h"
+
+#include <gtest/gtest.h>
+
+#include <random>
+#include <string>
+#include <string_view>
+
+#include "tests/guarded_buffer.h"
+
+namespace {
+
+const char* Naive(const char* p, const char* end, std::string_view pattern) {
+  for (; p < end; ++p) {
+    if (std::string_view(p, pattern.size()) == pattern) return p;
+  }
+  return nullptr;
+}
+
+// Texts of the delimiters' own bytes, so that partial matches abound, of every length around
+// the sixteen-byte steps.
+std::string RandomText(std::mt19937& random, std::size_t length) {
+  static constexpr char kBytes[] = "<>/Type=xT \n";
+  std::string text;
+  for (std::size_t i = 0; i < length; ++i)
+    text += kBytes[random() % (sizeof(kBytes) - 1)];
+  return text;
+}
+
+TEST(PatternSearchTest, FindsWhatAByteByByteSearchFinds) {
+  std::mt19937 random(7);
+  for (std::size_t length = 0; length <= 70; ++length) {
+    for (int round = 0; round < 20; ++round) {
+      const GuardedBuffer text(RandomText(random, length));
+      const char* const readable = text.data() + text.size();
+      for (std::string_view pattern : {"<", ">", "</", "Type="}) {
+        for (std::size_t from = 0; from <= length; ++from) {
+          const char* const p = text.data() + from;
+          if (static_cast<std::size_t>(readable - p) < pattern.size()) continue;
+          const char* const lastStart = readable - pattern.size() + 1;
+          // Searches up to the last start, and up to a few bytes before it.
+          for (const char* end : {lastStart, p + (lastStart - p) / 2, p}) {
+            SCOPED_TRACE(std::string(p, readable) + " / " + std::string(pattern));
+            EXPECT_EQ(pattern_search::Find(p, end, readable, pattern), Naive(p, end, pattern));
+            EXPECT_EQ(pattern_search::FindFar(p, end, pattern), Naive(p, end, pattern));
+          }
+          if (pattern.size() == 1) {
+            const char* const expected = readable - p < 16 ? nullptr : Naive(p, p + 16, pattern);
+            EXPECT_EQ(pattern_search::FindInNextSixteen(p, readable, pattern[0]), expected);
+          }
+        }
+      }
+    }
+  }
+}
+
+TEST(PatternSearchTest, SkipsWhiteSpaceUpToItsEnd) {
+  // Whitespace runs on both sides of the sixteen-byte steps, ending in another byte or at the
+  // end of the text.
+  for (std::size_t run = 0; run <= 40; ++run) {
+    std::string white;
+    for (std::size_t i = 0; i < run; ++i)
+      white += " \t\r\n"[i % 4];
+    for (const std::string& text : {white, white + "\v", white + "x  "}) {
+      const GuardedBuffer guarded(text);
+      const char* const end = guarded.data() + guarded.size();
+      EXPECT_EQ(pattern_search::SkipWhiteSpace(guarded.data(), end), guarded.data() + run) << run;
+      EXPECT_EQ(pattern_search::SkipWhiteSpace(guarded.data(), guarded.data() + run / 2),
+                guarded.data() + run / 2);
+    }
+  }
+}
+
+}  // namespace
