@@ -35,7 +35,7 @@ struct Plugins {
   int (*read)(Lum_DataPackage*, char*, int, bool, bool) = nullptr;
   void (*encrypt)(Lum_DataPackage*, char*, int) = nullptr;
   void (*decrypt)(Lum_DataPackage*, char*, int) = nullptr;
-  mutable std::shared_ptr<Vorn_Channel> scrambler;  // made by the plug-in when first needed
+  mutable std::shared_ptr<Vorn_Channel> scrambler{};  // made by the plug-in when first needed
 };
 
 // Where plug-ins are looked for, in order: beside the program's real path, the install layout's
