@@ -2,13 +2,17 @@
 """Times every datapack subcommand and takes its peak memory, on game-state packages of several
 sizes and on nested packages of several depths. Run by hand, not in CI:
 
-    bench/datapack_bench.py [--datapack build/default/bin/datapack] [--sizes 1,10,100]
-                            [--depths 10,100,1023] [--depth-size 2] [--work DIR]
+    bench/datapack_run [--sizes 1,10,100] [--depths 10,100,1023] [--depth-sizes 2,20]
+                       [--repeat N] [--work DIR]
 
-Each package is made by `datapack pack` from a generated JSON. Times are wall-clock seconds of
-the best of --repeat runs; memory is the peak resident set that /usr/bin/time reports, and, in the
-last column, that peak less the program's own (its peak showing the demo package), per byte of
-package.
+(bench/datapack_run installs python3 and GNU time when missing, builds, and runs this script.)
+
+Each package is made by `datapack pack` from a generated JSON. Times are CPU seconds, user and
+system, the best of --repeat runs: other work on the machine disturbs them little. Per byte, they
+count the bytes the command reads (the JSON text for pack, both packages for diff) and leave out
+the program's start (the best time of showing the demo package, loading the plug-ins included).
+Memory is the peak resident set; the last column is that peak less the program's own (its peak
+showing the demo package), per byte of package.
 """
 
 import argparse
@@ -18,6 +22,7 @@ import random
 import subprocess
 import sys
 import tempfile
+import resource
 
 MB = 1 << 20
 
@@ -69,15 +74,18 @@ def nested(depth, size):
 
 
 def run(command, stdin_path=None, stdout_path=os.devnull):
-    """Seconds and peak resident kilobytes of one run; the exit status must be 0 or 1."""
+    """CPU seconds (user and system) and peak resident bytes of one run; the exit status must be 0 or 1. GNU time
+    takes the peak: a child of this process would count the interpreter's pages as its own."""
     with open(stdin_path or os.devnull, "rb") as stdin, open(stdout_path, "wb") as stdout:
-        result = subprocess.run(["/usr/bin/time", "-f", "%e %M"] + command, stdin=stdin,
+        before = resource.getrusage(resource.RUSAGE_CHILDREN)
+        result = subprocess.run(["/usr/bin/time", "-f", "%M"] + command, stdin=stdin,
                                 stdout=stdout, stderr=subprocess.PIPE)
-    last = result.stderr.decode(errors="replace").strip().splitlines()[-1]
+        after = resource.getrusage(resource.RUSAGE_CHILDREN)
+        seconds = (after.ru_utime + after.ru_stime) - (before.ru_utime + before.ru_stime)
     if result.returncode not in (0, 1):
         raise SystemExit("failed: %s\n%s" % (" ".join(command), result.stderr.decode()))
-    seconds, kilobytes = last.split()
-    return float(seconds), int(kilobytes) * 1024
+    kilobytes = result.stderr.decode(errors="replace").strip().splitlines()[-1]
+    return seconds, int(kilobytes) * 1024
 
 
 def measure(datapack, work, name, description, repeat, commands):
@@ -94,11 +102,13 @@ def measure(datapack, work, name, description, repeat, commands):
     rows = []
     for label, arguments in commands:
         arguments = [a.format(pkg=package, json=shown, other=other) for a in arguments]
+        # What the command reads: pack a JSON text, diff two packages, the others one package.
+        read = sum(os.path.getsize(a) for a in arguments if a in (package, shown, other))
         best = None
         for _ in range(repeat):
             seconds, peak = run([datapack] + arguments)
             best = (seconds, peak) if best is None or seconds < best[0] else best
-        rows.append((label, best[0], best[1]))
+        rows.append((label, read, best[0], best[1]))
     for path in (source, shown, other):
         os.remove(path)
     os.remove(package)
@@ -110,8 +120,8 @@ def main():
     parser.add_argument("--datapack", default="build/default/bin/datapack")
     parser.add_argument("--sizes", default="1,10,100", help="game-state sizes in MB")
     parser.add_argument("--depths", default="10,100,1023", help="nesting depths")
-    parser.add_argument("--depth-size", type=float, default=2, help="MB of each nested package")
-    parser.add_argument("--repeat", type=int, default=1)
+    parser.add_argument("--depth-sizes", default="2", help="MB of the nested packages")
+    parser.add_argument("--repeat", type=int, default=3)
     parser.add_argument("--commands", default="show,show --json,pack,scramble,unscramble,check,diff")
     parser.add_argument("--work", default=None, help="folder for the packages (default: a temp)")
     options = parser.parse_args()
@@ -131,19 +141,22 @@ def main():
 
     cases = [("game state %g MB" % float(s), "game%s" % s, game_state(int(float(s) * MB)))
              for s in options.sizes.split(",")]
-    cases += [("nested depth %s" % d, "nested%s" % d, nested(int(d), int(options.depth_size * MB)))
-              for d in options.depths.split(",")]
+    cases += [("nested %s deep %g MB" % (d, float(m)), "nested%s_%s" % (d, m),
+               nested(int(d), int(float(m) * MB)))
+              for d in options.depths.split(",") for m in options.depth_sizes.split(",")]
     demo = os.path.join(work, "demo.pkg")
     run([datapack, "demo", "-o", demo])
-    base = run([datapack, "show", demo])[1]
-    print("%-22s %-12s %10s %9s %12s %9s %9s %9s" % ("package", "command", "bytes", "seconds",
-                                                     "ns/byte", "peak MB", "peak/size", "above/size"))
+    start, base = min(run([datapack, "show", demo]) for _ in range(5))
+    print("start-up %.1f ms, peak %.1f MB" % (start * 1e3, base / MB))
+    print("%-22s %-12s %10s %10s %9s %12s %9s %9s %9s" % (
+        "package", "command", "bytes", "read", "seconds", "ns/byte read", "peak MB", "peak/size",
+        "above/size"))
     for title, name, description in cases:
         size, rows = measure(datapack, work, name, description, options.repeat, commands)
-        for label, seconds, peak in rows:
-            print("%-22s %-12s %10d %9.2f %12.1f %9.1f %9.2f %9.2f" %
-                  (title, label, size, seconds, seconds * 1e9 / size, peak / MB, peak / size,
-                   (peak - base) / size))
+        for label, read, seconds, peak in rows:
+            print("%-22s %-12s %10d %10d %9.3f %12.1f %9.1f %9.2f %9.2f" %
+                  (title, label, size, read, seconds, (seconds - start) * 1e9 / read, peak / MB,
+                   peak / size, (peak - base) / size))
             sys.stdout.flush()
         description.clear()
 

@@ -15,3 +15,12 @@
 #else
 #define TESSEL_API VORN_IMPORT
 #endif
+
+// Whether the base classes keep room for the real engine's data. Only a build in the engine's own
+// ABI (Microsoft's) can be loaded beside the real engine and the real string-channel plug-in;
+// elsewhere the stand-ins are the engine, and the room would only cost every channel its size.
+#if defined(_MSC_VER)
+#define VORN_ENGINE_ROOM 1
+#else
+#define VORN_ENGINE_ROOM 0
+#endif

@@ -78,6 +78,8 @@ const char* Vorn_Channel::GetChannelName() { return state_->name.c_str(); }
 
 void Vorn_Channel::SetChildCreationCount(int count) {
   state_->childCreationCount = count;
+  // Declarations follow; a record is a few hundred bytes, so room for just these, within reason.
+  if (count > 0 && count <= 64) state_->links.reserve(static_cast<std::size_t>(count));
   TraceEngineCall(*this, "SetChildCreationCount", count);
 }
 

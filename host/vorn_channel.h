@@ -60,13 +60,19 @@ class TESSEL_API Vorn_Channel {
   // A plug-in allocates its channels with the size these declarations give, and the engine's own
   // constructor fills the base part: the real engine's data must fit. Room for several fixed
   // 2048-character fields, the style of the plug-ins' own records, and link tables besides.
+#if VORN_ENGINE_ROOM
   static constexpr std::size_t kDataBytes = 8192;
+#else
+  static constexpr std::size_t kDataBytes = sizeof(void*);
+#endif
 
  private:
   struct State;
   // The stand-in keeps its state elsewhere; nothing but this pointer lives in the room.
   State* state_;
+#if VORN_ENGINE_ROOM
   [[maybe_unused]] unsigned char reserved_[kDataBytes - sizeof(State*)];
+#endif
 };
 
 static_assert(sizeof(Vorn_Channel) == sizeof(void*) + Vorn_Channel::kDataBytes,

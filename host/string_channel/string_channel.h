@@ -42,12 +42,18 @@ class STRING_CHANNEL_API Lum_StringChannel : public Vorn_Channel {
 
   // As for the engine's base: the real string channel's data must fit in what a DataDirectory
   // allocates for it, and may hold its text in fixed 8- and 16-bit fields.
+#if VORN_ENGINE_ROOM
   static constexpr std::size_t kDataBytes = 16384;
+#else
+  static constexpr std::size_t kDataBytes = sizeof(void*);
+#endif
 
  private:
   struct State;
   State* state_;
+#if VORN_ENGINE_ROOM
   [[maybe_unused]] unsigned char reserved_[kDataBytes - sizeof(State*)];
+#endif
 };
 
 static_assert(sizeof(Lum_StringChannel) == sizeof(Vorn_Channel) + Lum_StringChannel::kDataBytes,
