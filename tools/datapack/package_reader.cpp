@@ -9,20 +9,60 @@
 namespace datapack {
 namespace {
 
+// A Place made only when a message needs one. Every entry and value of a package has a place, and
+// making each costs more than comparing it; the steps wait on the stack instead, so a Way must not
+// outlive the one it was made from.
+class Way {
+ public:
+  explicit Way(const Place& start) : start_(&start) {}
+  Way Key(std::string_view key) const { return Way(this, kKey, key, 0); }
+  Way Item(std::size_t index) const { return Way(this, kItem, {}, index); }
+  Way Entry(std::size_t index) const { return Way(this, kEntry, {}, index); }
+  Way Named(std::string_view name) const { return Way(this, kNamed, name, 0); }
+
+  Place Made() const {
+    if (start_) return *start_;
+    const Place before = before_->Made();
+    switch (kind_) {
+      case kKey:
+        return before.Key(text_);
+      case kItem:
+        return before.Item(index_);
+      case kEntry:
+        return before.Entry(index_);
+      case kNamed:
+        break;
+    }
+    return before.Named(text_);
+  }
+
+ private:
+  enum Kind { kKey, kItem, kEntry, kNamed };
+  Way(const Way* before, Kind kind, std::string_view text, std::size_t index)
+      : before_(before), kind_(kind), text_(text), index_(index) {}
+
+  const Place* start_ = nullptr;
+  const Way* before_ = nullptr;
+  Kind kind_ = kKey;
+  std::string_view text_;
+  std::size_t index_ = 0;
+};
+
 void FindShortfalls(const FoundDirectory& found, const Shape& shape,
-                    const std::vector<Entry>& entries, const Place& place,
+                    const std::vector<Entry>& entries, const Way& place,
                     std::vector<Shortfall>& out) {
   if (found.entries.size() != entries.size()) {
     out.push_back({found.offset, "the text holds " +
                                      Counted(found.entries.size(), "entry", "entries") + " of " +
-                                     ShownPath(place.Path()) + ", the reader takes " +
+                                     ShownPath(place.Made().Path()) + ", the reader takes " +
                                      std::to_string(entries.size())});
   }
   for (std::size_t i = 0; i < std::min(found.entries.size(), entries.size()); ++i) {
+    const Way entry = place.Entry(i);
     for (std::size_t k = 0; k < shape.directories.size(); ++k) {
       const Shape& sub = shape.directories[k];
-      FindShortfalls(found.entries[i][k], sub, entries[i].directories[k],
-                     place.Entry(i).Named(sub.name), out);
+      FindShortfalls(found.entries[i][k], sub, entries[i].directories[k], entry.Named(sub.name),
+                     out);
     }
   }
 }
@@ -68,26 +108,30 @@ Problem Report(const Place& place, const std::string& message) {
 
 std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& meantEntries,
                                   const Shape& read, const std::vector<Entry>& readEntries,
-                                  const Place& list);
+                                  const Way& list);
 
 // The first place where an entry read back differs from what was meant.
 std::optional<Problem> EntryDifference(const Shape& meant, const Entry& meantEntry,
                                        const Shape& read, const Entry& readEntry,
-                                       const Place& entry) {
+                                       const Way& entry) {
+  const Way values = entry.Key(kValuesKey);
   for (std::size_t j = 0; j < meant.data.size(); ++j) {
-    const Place value = entry.Key(kValuesKey).Item(j).Named(meant.data[j].name);
+    const Way item = values.Item(j);
+    const Way value = item.Named(meant.data[j].name);
     if (j >= read.data.size() || read.data[j] != meant.data[j]) {
-      return Report(value, "the reader does not find this element");
+      return Report(value.Made(), "the reader does not find this element");
     }
     if (!SameWritten(meantEntry.values[j], readEntry.values[j])) {
-      return Report(value, "reads back as " + Written(readEntry.values[j]));
+      return Report(value.Made(), "reads back as " + Written(readEntry.values[j]));
     }
   }
+  const Way directories = entry.Key(kDirectoriesKey);
   for (std::size_t k = 0; k < meant.directories.size(); ++k) {
     const Shape& sub = meant.directories[k];
-    const Place subList = entry.Key(kDirectoriesKey).Item(k).Named(sub.name);
+    const Way item = directories.Item(k);
+    const Way subList = item.Named(sub.name);
     if (k >= read.directories.size()) {
-      return Report(subList, "the reader does not find this directory");
+      return Report(subList.Made(), "the reader does not find this directory");
     }
     if (auto problem = Difference(sub, meantEntry.directories[k], read.directories[k],
                                   readEntry.directories[k], subList)) {
@@ -108,11 +152,13 @@ std::optional<Problem> CountDifference(std::size_t meantCount, std::size_t readC
 // The first place where what was read back differs from what was meant.
 std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& meantEntries,
                                   const Shape& read, const std::vector<Entry>& readEntries,
-                                  const Place& list) {
+                                  const Way& list) {
   const std::size_t meantCount = WrittenEmpty(meant, meantEntries) ? 0 : meantEntries.size();
   const std::size_t readCount = WrittenEmpty(read, readEntries) ? 0 : readEntries.size();
-  if (meant.name != read.name) return Report(list, "the name reads back as \"" + read.name + "\"");
-  if (auto problem = CountDifference(meantCount, readCount, list)) return problem;
+  if (meant.name != read.name) {
+    return Report(list.Made(), "the name reads back as \"" + read.name + "\"");
+  }
+  if (meantCount != readCount) return CountDifference(meantCount, readCount, list.Made());
   for (std::size_t i = 0; i < meantCount; ++i) {
     if (auto problem =
             EntryDifference(meant, meantEntries[i], read, readEntries[i], list.Entry(i))) {
@@ -141,8 +187,8 @@ ReadResult ReadPackage(const Plugins& plugins, std::string& text, const EntrySin
 
 std::vector<Shortfall> FindShortfalls(const ReadResult& result) {
   std::vector<Shortfall> shortfalls;
-  FindShortfalls(result.found, result.package.top, result.package.entries,
-                 Place().Named(result.package.top.name), shortfalls);
+  const Place top = Place().Named(result.package.top.name);
+  FindShortfalls(result.found, result.package.top, result.package.entries, Way(top), shortfalls);
   return shortfalls;
 }
 
@@ -170,7 +216,8 @@ std::optional<Problem> CheckReadBack(const Plugins& plugins, const Package& pack
   const auto compare = [&](Entry&& entry) {
     const std::size_t i = count++;
     if (!first && i < package.entries.size()) {
-      first = EntryDifference(package.top, package.entries[i], structure.top, entry, list.Entry(i));
+      first = EntryDifference(package.top, package.entries[i], structure.top, entry,
+                              Way(list).Entry(i));
     }
   };
   const std::vector<Entry> read =
