@@ -78,8 +78,6 @@ const char* Vorn_Channel::GetChannelName() { return state_->name.c_str(); }
 
 void Vorn_Channel::SetChildCreationCount(int count) {
   state_->childCreationCount = count;
-  // Declarations follow; a record is a few hundred bytes, so room for just these, within reason.
-  if (count > 0 && count <= 64) state_->links.reserve(static_cast<std::size_t>(count));
   TraceEngineCall(*this, "SetChildCreationCount", count);
 }
 
@@ -87,7 +85,11 @@ void Vorn_Channel::SetChildCreateType(ChildCreation record, int link) {
   TraceEngineCall(*this, "SetChildCreateType", link);
   if (link < 0) return;
   std::vector<State::Link>& links = state_->links;
-  if (static_cast<std::size_t>(link) >= links.size()) links.resize(link + 1);
+  if (static_cast<std::size_t>(link) >= links.size()) {
+    // A record is a few hundred bytes and a channel declares a handful: room for just these.
+    links.reserve(static_cast<std::size_t>(link) + 1);
+    links.resize(static_cast<std::size_t>(link) + 1);
+  }
   links[link].declared = true;
   links[link].record = record;
 }
