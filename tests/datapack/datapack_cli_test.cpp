@@ -96,6 +96,33 @@ TEST(DatapackCliTest, ShowsThePlayersPackageAsOutlineAndJson) {
   EXPECT_EQ(packed.out, kPlayersPackage);
 }
 
+// A chain of directories this deep, one value at each level.
+std::string Chain(int depth) {
+  std::string shape;
+  std::string entry;
+  for (int level = depth - 1; level >= 0; --level) {
+    const std::string name = "L" + std::to_string(level);
+    shape = "{\"name\": \"" + name + "\", \"data\": [{\"name\": \"v\", \"type\": \"Val\"}], " +
+            "\"directories\": [" + shape + "]";
+    entry = "{\"values\": [" + std::to_string(level) + "]" +
+            (entry.empty() ? "" : ", \"directories\": [[" + entry + "]]") + "}";
+    if (level > 0) shape += "}";
+  }
+  return "{\"directory\": " + shape + ", \"entries\": [" + entry + "]}}";
+}
+
+// The package's own indentation grows by a tab a level; its JSON must not grow by more.
+TEST(DatapackCliTest, DeepNestingShowsAsJsonNoLargerThanItsPackage) {
+  const RunResult packed = RunDatapack({"pack", "-"}, Chain(300));
+  ASSERT_EQ(packed.status, 0) << packed.err;
+  const RunResult json = RunDatapack({"show", "-", "--json"}, packed.out);
+  ASSERT_EQ(json.status, 0) << json.err;
+  EXPECT_LT(json.out.size(), packed.out.size());
+  const RunResult again = RunDatapack({"pack", "-"}, json.out);
+  EXPECT_EQ(again.status, 0) << again.err;
+  EXPECT_EQ(again.out, packed.out);
+}
+
 TEST(DatapackCliTest, BadInputNamesTheFileAndPlace) {
   const fs::path folder = ScratchFolder();
   const std::string scrambled = RunDatapack({"scramble"}, kPlayersPackage).out;
