@@ -419,7 +419,13 @@ int ScanFloatGroups(const char* first, const char* last, int count, int group, f
                     const char** end) {
   int stored = 0;
   const char* p = first;
-  while (const char* const scanned = ScanFloat(p, last, values[stored])) {
+  for (;;) {
+    // The plain path first, here, without the call: nearly every number of a package takes it.
+    const char* const number = SkipSpace(p, last);
+    const char* scanned =
+        last - number >= kPlainRoom ? ScanPlainDecimal(number, values[stored]) : nullptr;
+    if (!scanned) scanned = ScanFloat(p, last, values[stored]);
+    if (!scanned) break;
     p = scanned;
     if (++stored == count) break;
     if (stored % group == 0) {

@@ -63,7 +63,9 @@ TEST(PatternSearchTest, SkipsWhiteSpaceUpToItsEnd) {
     std::string white;
     for (std::size_t i = 0; i < run; ++i)
       white += " \t\r\n"[i % 4];
-    for (const std::string& text : {white, white + "\v", white + "x  "}) {
+    for (const std::string& text :
+         {white, white + "\v", white + "x  ", white + std::string(1, '\0'), white + "\xa0" + white,
+          white + "\f" + white}) {
       const GuardedBuffer guarded(text);
       const char* const end = guarded.data() + guarded.size();
       EXPECT_EQ(pattern_search::SkipWhiteSpace(guarded.data(), end), guarded.data() + run) << run;
