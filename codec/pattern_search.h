@@ -16,6 +16,15 @@
 #endif
 #endif
 
+// Keeps a rare path's registers and set-up out of the common path that calls it.
+#if defined(__GNUC__) || defined(__clang__)
+#define PACKAGE_SEARCH_NOINLINE __attribute__((noinline))
+#elif defined(_MSC_VER)
+#define PACKAGE_SEARCH_NOINLINE __declspec(noinline)
+#else
+#define PACKAGE_SEARCH_NOINLINE
+#endif
+
 namespace pattern_search {
 
 #if defined(PACKAGE_SEARCH_SSE2)
@@ -85,17 +94,22 @@ inline const char* Find(const char* p, const char* end, const char* readable,
 #endif
 }
 
-// The first `c` among the sixteen bytes from p, or null when they hold none or the text ends
-// before them.
-inline const char* FindInNextSixteen(const char* p, const char* readable, char c) {
-  if (readable - p < 16) return nullptr;
+// The first occurrence of `pattern` starting among the sixteen bytes from p, or null when they
+// hold none or the text ends before an occurrence starting there would.
+inline const char* FindInNextSixteen(const char* p, const char* readable,
+                                     std::string_view pattern) {
+  if (readable - p < static_cast<std::ptrdiff_t>(15 + pattern.size())) return nullptr;
 #if defined(PACKAGE_SEARCH_SSE2)
   const __m128i block = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
-  const unsigned mask =
-      static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(block, _mm_set1_epi8(c))));
-  return mask != 0 ? p + LowestBit(mask) : nullptr;
+  unsigned mask =
+      static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(block, _mm_set1_epi8(pattern[0]))));
+  for (; mask != 0; mask &= mask - 1) {
+    const char* const candidate = p + LowestBit(mask);
+    if (RestMatches(candidate, pattern)) return candidate;
+  }
+  return nullptr;
 #else
-  return static_cast<const char*>(std::memchr(p, c, 16));
+  return FindFar(p, p + 16, pattern);
 #endif
 }
 

@@ -46,10 +46,9 @@ TEST(PatternSearchTest, FindsWhatAByteByByteSearchFinds) {
             EXPECT_EQ(pattern_search::Find(p, end, readable, pattern), Naive(p, end, pattern));
             EXPECT_EQ(pattern_search::FindFar(p, end, pattern), Naive(p, end, pattern));
           }
-          if (pattern.size() == 1) {
-            const char* const expected = readable - p < 16 ? nullptr : Naive(p, p + 16, pattern);
-            EXPECT_EQ(pattern_search::FindInNextSixteen(p, readable, pattern[0]), expected);
-          }
+          const bool room = readable - p >= static_cast<std::ptrdiff_t>(15 + pattern.size());
+          EXPECT_EQ(pattern_search::FindInNextSixteen(p, readable, pattern),
+                    room ? Naive(p, p + 16, pattern) : nullptr);
         }
       }
     }
