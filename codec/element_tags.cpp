@@ -37,6 +37,7 @@ const char* ScanNumbers(const char* at, const char* textEnd, int count, float* v
 // The ">" of a tag when it stands within a few bytes of `from`, or null: then the reader's own
 // search, which remembers what it found, takes over.
 const char* NearbyClose(const char* from, const char* textEnd) {
+  if (const char* close = pattern_search::FindInNextSixteen(from, textEnd, ">")) return close;
   constexpr std::ptrdiff_t kNearby = 32;
   const char* const end = textEnd - from > kNearby ? from + kNearby : textEnd;
   return pattern_search::Find(from, end, textEnd, ">");

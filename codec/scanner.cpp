@@ -187,7 +187,8 @@ int Lum_DataPackage::GetItemType(char* name) {
   MovePast("<");
   skipWhiteSpace();
   const std::size_t nameLength = std::strlen(name);
-  if (StartsWith(rest(), name) && rest().size() > nameLength) {
+  if (rest().size() > nameLength &&
+      pattern_search::SameBytes(bufferStart + bufferCursor, name, nameLength)) {
     skip(nameLength);
     skipWhiteSpace();
     if (rest().starts_with("id")) {
