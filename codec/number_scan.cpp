@@ -425,14 +425,16 @@ int ScanFloatGroups(const char* first, const char* last, int count, int group, f
     const char* scanned =
         last - number >= kPlainRoom ? ScanPlainDecimal(number, values[stored]) : nullptr;
     if (!scanned) scanned = ScanFloat(p, last, values[stored]);
-    if (!scanned) break;
+    if (!scanned) {
+      if (stored > 0) p = number;  // the space before it matched the format's
+      break;
+    }
     p = scanned;
     if (++stored == count) break;
     if (stored % group == 0) {
       if (At(p, last) != ',') break;
       ++p;
     }
-    p = SkipSpace(p, last);
   }
   *end = p;
   return stored;
