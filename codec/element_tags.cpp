@@ -154,7 +154,7 @@ bool Lum_DataPackage::ReadTypedElementName(const char* name) {
   const std::size_t length = std::strlen(name);
   // Elements follow one another with only whitespace between them: a "<" after whitespace is
   // the first one ahead.
-  const char* open = pattern_search::SkipWhiteSpace(bufferStart + start, textEnd);
+  const char* open = pattern_search::SkipIndentation(bufferStart + start, textEnd);
   if (open == textEnd || *open != '<') open = Find("<");
   if (open && IsPlainName(std::string_view(name, length))) {
     // The trimmed text between "<" and the first "Type=" equals such a name exactly when the name

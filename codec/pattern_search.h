@@ -47,6 +47,24 @@ inline const char* SkipWhiteSpace(const char* p, const char* end) {
   return p;
 }
 
+// SkipWhiteSpace for runs that are seldom short, such as the newline and tabs before an element:
+// sixteen bytes at a step.
+inline const char* SkipIndentation(const char* p, const char* end) {
+#if defined(PACKAGE_SEARCH_SSE2)
+  while (end - p >= 16) {
+    const __m128i block = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+    const __m128i white = _mm_or_si128(_mm_or_si128(_mm_cmpeq_epi8(block, _mm_set1_epi8(' ')),
+                                                    _mm_cmpeq_epi8(block, _mm_set1_epi8('\t'))),
+                                       _mm_or_si128(_mm_cmpeq_epi8(block, _mm_set1_epi8('\n')),
+                                                    _mm_cmpeq_epi8(block, _mm_set1_epi8('\r'))));
+    const unsigned other = ~static_cast<unsigned>(_mm_movemask_epi8(white)) & 0xffffu;
+    if (other != 0) return p + LowestBit(other);
+    p += 16;
+  }
+#endif
+  return SkipWhiteSpace(p, end);
+}
+
 // The bytes after the first one match the rest of the pattern.
 inline bool RestMatches(const char* p, std::string_view pattern) {
   for (std::size_t i = 1; i < pattern.size(); ++i) {

@@ -67,9 +67,10 @@ TEST(PatternSearchTest, SkipsWhiteSpaceUpToItsEnd) {
           white + "\f" + white}) {
       const GuardedBuffer guarded(text);
       const char* const end = guarded.data() + guarded.size();
-      EXPECT_EQ(pattern_search::SkipWhiteSpace(guarded.data(), end), guarded.data() + run) << run;
-      EXPECT_EQ(pattern_search::SkipWhiteSpace(guarded.data(), guarded.data() + run / 2),
-                guarded.data() + run / 2);
+      for (const auto skip : {pattern_search::SkipWhiteSpace, pattern_search::SkipIndentation}) {
+        EXPECT_EQ(skip(guarded.data(), end), guarded.data() + run) << run;
+        EXPECT_EQ(skip(guarded.data(), guarded.data() + run / 2), guarded.data() + run / 2);
+      }
     }
   }
 }
