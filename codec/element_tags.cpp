@@ -163,8 +163,11 @@ bool Lum_DataPackage::ReadTypedElementName(const char* name) {
     const char* p = pattern_search::SkipWhiteSpace(open + 1, textEnd);
     const char* const type =
         pattern_search::SkipWhiteSpace(p + std::min(length, std::size_t(textEnd - p)), textEnd);
+    // Names of eight bytes or fewer in strg2, where ReadWriteData puts them, compare as a word.
+    const bool few = length <= 8 && name == strg2 && textEnd - p >= 8;
     const bool match = static_cast<std::size_t>(textEnd - p) >= length &&
-                       pattern_search::SameBytes(p, name, length) &&
+                       (few ? pattern_search::SameFewBytes(p, name, length)
+                            : pattern_search::SameBytes(p, name, length)) &&
                        std::string_view(type, textEnd).starts_with("Type=");
     if (!match) {
       bufferCursor = start;

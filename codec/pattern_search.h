@@ -2,7 +2,9 @@
 // x86 target the plug-in is built for), a byte at a step elsewhere.
 #pragma once
 
+#include <bit>
 #include <cstddef>
+#include <cstdint>
 #include <cstring>
 #include <string_view>
 
@@ -137,6 +139,22 @@ inline bool SameBytes(const char* p, const char* text, std::size_t length) {
     if (p[i] != text[i]) return false;
   }
   return true;
+}
+
+// SameBytes for at most eight bytes, where eight bytes are readable at both p and text: one
+// comparison of the first eight, those past `length` left out.
+inline bool SameFewBytes(const char* p, const char* text, std::size_t length) {
+  if constexpr (std::endian::native == std::endian::little) {
+    std::uint64_t a;
+    std::uint64_t b;
+    std::memcpy(&a, p, sizeof(a));
+    std::memcpy(&b, text, sizeof(b));
+    const std::uint64_t wanted =
+        length >= 8 ? ~std::uint64_t{0} : (std::uint64_t{1} << 8 * length) - 1;
+    return ((a ^ b) & wanted) == 0;
+  } else {
+    return SameBytes(p, text, length);
+  }
 }
 
 }  // namespace pattern_search

@@ -75,4 +75,21 @@ TEST(PatternSearchTest, SkipsWhiteSpaceUpToItsEnd) {
   }
 }
 
+TEST(PatternSearchTest, ComparesFewBytesAsSameBytesDoes) {
+  // Eight readable bytes on both sides, differing at every place or nowhere, for every length.
+  const std::string base = "Position";
+  for (std::size_t length = 0; length <= 8; ++length) {
+    for (std::size_t differs = 0; differs <= 8; ++differs) {
+      std::string other = base;
+      if (differs < 8) other[differs] = static_cast<char>(other[differs] ^ 0x80);
+      const GuardedBuffer a(base);
+      const GuardedBuffer b(other);
+      EXPECT_EQ(pattern_search::SameFewBytes(a.data(), b.data(), length),
+                pattern_search::SameBytes(a.data(), b.data(), length))
+          << length << " " << differs;
+      EXPECT_EQ(pattern_search::SameBytes(a.data(), b.data(), length), differs >= length);
+    }
+  }
+}
+
 }  // namespace
