@@ -88,7 +88,7 @@ bool Lum_DataPackage::XML_OpeningIDTag(char* name, int id) {
     return true;
   }
   const int start = bufferCursor;
-  const std::size_t nameLength = std::strlen(name);
+  const std::size_t nameLength = pattern_search::TextLength(name, tagName);
   std::string_view head;  // the tag's content, cut to the name's length
   const std::string_view wanted(name, nameLength);
   do {
@@ -115,7 +115,7 @@ void Lum_DataPackage::XML_ClosingTag(char* name) {
     AppendPieces({Newline(), Indentation(), "</", name, ">"});
     return;
   }
-  const std::string_view wanted(name);
+  const std::string_view wanted(name, pattern_search::TextLength(name, tagName));
   std::string_view content;
   do {
     MovePast("</");
@@ -151,7 +151,7 @@ bool Lum_DataPackage::IsPlainName(std::string_view name) {
 
 bool Lum_DataPackage::ReadTypedElementName(const char* name) {
   const int start = bufferCursor;
-  const std::size_t length = std::strlen(name);
+  const std::size_t length = pattern_search::TextLength(name, strg2);
   // Elements follow one another with only whitespace between them: a "<" after whitespace is
   // the first one ahead.
   const char* open = pattern_search::SkipIndentation(bufferStart + start, textEnd);

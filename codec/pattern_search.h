@@ -141,6 +141,22 @@ inline bool SameBytes(const char* p, const char* text, std::size_t length) {
   return true;
 }
 
+// strlen, one step for a short text in `field`, a fixed text field of at least sixteen bytes
+// (names are short, and the reader measures them again at every element).
+inline std::size_t TextLength(const char* text, const char* field) {
+#if defined(PACKAGE_SEARCH_SSE2)
+  if (text == field) {
+    const __m128i block = _mm_loadu_si128(reinterpret_cast<const __m128i*>(text));
+    const unsigned nul =
+        static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(block, _mm_setzero_si128())));
+    if (nul != 0) return LowestBit(nul);
+  }
+#else
+  (void)field;
+#endif
+  return std::strlen(text);
+}
+
 // SameBytes for at most eight bytes, where eight bytes are readable at both p and text: one
 // comparison of the first eight, those past `length` left out.
 inline bool SameFewBytes(const char* p, const char* text, std::size_t length) {

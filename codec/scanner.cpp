@@ -186,7 +186,7 @@ int Lum_DataPackage::GetItemType(char* name) {
   int type = 0;
   MovePast("<");
   skipWhiteSpace();
-  const std::size_t nameLength = std::strlen(name);
+  const std::size_t nameLength = pattern_search::TextLength(name, tagName);
   if (rest().size() > nameLength &&
       pattern_search::SameBytes(bufferStart + bufferCursor, name, nameLength)) {
     skip(nameLength);

@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstring>
 #include <random>
 #include <string>
 #include <string_view>
@@ -89,6 +90,18 @@ TEST(PatternSearchTest, ComparesFewBytesAsSameBytesDoes) {
           << length << " " << differs;
       EXPECT_EQ(pattern_search::SameBytes(a.data(), b.data(), length), differs >= length);
     }
+  }
+}
+
+TEST(PatternSearchTest, MeasuresTextsInAFieldAsStrlenDoes) {
+  // Lengths on both sides of the sixteen-byte step, in the field and elsewhere.
+  char field[64];
+  for (std::size_t length = 0; length < sizeof(field); ++length) {
+    std::memset(field, 'n', sizeof(field));
+    field[length] = '\0';
+    EXPECT_EQ(pattern_search::TextLength(field, field), length);
+    const GuardedBuffer elsewhere(std::string(field, length + 1));
+    EXPECT_EQ(pattern_search::TextLength(elsewhere.data(), field), length);
   }
 }
 
