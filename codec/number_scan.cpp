@@ -349,6 +349,7 @@ const char* ScanPlainDecimal(const char* p, float& value) {
   std::uint32_t significand = 0;
   for (; IsDigit(*p) && p < stop; ++p)
     significand = significand * 10 + static_cast<std::uint32_t>(*p - '0');
+  if (p == stop) return nullptr;
   const char* const point = p;
   if (*p == '.') {
     for (++p; IsDigit(*p) && p < stop; ++p)
