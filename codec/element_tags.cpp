@@ -37,6 +37,7 @@ const char* ScanNumbers(const char* at, const char* textEnd, int count, float* v
 // The ">" of a tag when it stands within a few bytes of `from`, or null: then the reader's own
 // search, which remembers what it found, takes over.
 const char* NearbyClose(const char* from, const char* textEnd) {
+  if (const char* close = pattern_search::FindInNextSixteen(from, textEnd, ">")) return close;
   constexpr std::ptrdiff_t kNearby = 32;
   const char* const end = textEnd - from > kNearby ? from + kNearby : textEnd;
   return pattern_search::Find(from, end, textEnd, ">");
@@ -87,7 +88,7 @@ bool Lum_DataPackage::XML_OpeningIDTag(char* name, int id) {
     return true;
   }
   const int start = bufferCursor;
-  const std::size_t nameLength = std::strlen(name);
+  const std::size_t nameLength = pattern_search::TextLength(name, tagName);
   std::string_view head;  // the tag's content, cut to the name's length
   const std::string_view wanted(name, nameLength);
   do {
@@ -114,7 +115,7 @@ void Lum_DataPackage::XML_ClosingTag(char* name) {
     AppendPieces({Newline(), Indentation(), "</", name, ">"});
     return;
   }
-  const std::string_view wanted(name);
+  const std::string_view wanted(name, pattern_search::TextLength(name, tagName));
   std::string_view content;
   do {
     MovePast("</");
@@ -150,10 +151,10 @@ bool Lum_DataPackage::IsPlainName(std::string_view name) {
 
 bool Lum_DataPackage::ReadTypedElementName(const char* name) {
   const int start = bufferCursor;
-  const std::size_t length = std::strlen(name);
+  const std::size_t length = pattern_search::TextLength(name, strg2);
   // Elements follow one another with only whitespace between them: a "<" after whitespace is
   // the first one ahead.
-  const char* open = pattern_search::SkipWhiteSpace(bufferStart + start, textEnd);
+  const char* open = pattern_search::SkipIndentation(bufferStart + start, textEnd);
   if (open == textEnd || *open != '<') open = Find("<");
   if (open && IsPlainName(std::string_view(name, length))) {
     // The trimmed text between "<" and the first "Type=" equals such a name exactly when the name
@@ -162,8 +163,11 @@ bool Lum_DataPackage::ReadTypedElementName(const char* name) {
     const char* p = pattern_search::SkipWhiteSpace(open + 1, textEnd);
     const char* const type =
         pattern_search::SkipWhiteSpace(p + std::min(length, std::size_t(textEnd - p)), textEnd);
+    // Names of eight bytes or fewer in strg2, where ReadWriteData puts them, compare as a word.
+    const bool few = length <= 8 && name == strg2 && textEnd - p >= 8;
     const bool match = static_cast<std::size_t>(textEnd - p) >= length &&
-                       pattern_search::SameBytes(p, name, length) &&
+                       (few ? pattern_search::SameFewBytes(p, name, length)
+                            : pattern_search::SameBytes(p, name, length)) &&
                        std::string_view(type, textEnd).starts_with("Type=");
     if (!match) {
       bufferCursor = start;

@@ -2,7 +2,9 @@
 // x86 target the plug-in is built for), a byte at a step elsewhere.
 #pragma once
 
+#include <bit>
 #include <cstddef>
+#include <cstdint>
 #include <cstring>
 #include <string_view>
 
@@ -14,6 +16,15 @@
 #if defined(_MSC_VER) && !defined(__clang__)
 #include <intrin.h>
 #endif
+#endif
+
+// Keeps a rare path's registers and set-up out of the common path that calls it.
+#if defined(__GNUC__) || defined(__clang__)
+#define PACKAGE_SEARCH_NOINLINE __attribute__((noinline))
+#elif defined(_MSC_VER)
+#define PACKAGE_SEARCH_NOINLINE __declspec(noinline)
+#else
+#define PACKAGE_SEARCH_NOINLINE
 #endif
 
 namespace pattern_search {
@@ -36,6 +47,24 @@ inline const char* SkipWhiteSpace(const char* p, const char* end) {
   while (p < end && IsWhiteSpaceChar(*p))
     ++p;
   return p;
+}
+
+// SkipWhiteSpace for runs that are seldom short, such as the newline and tabs before an element:
+// sixteen bytes at a step.
+inline const char* SkipIndentation(const char* p, const char* end) {
+#if defined(PACKAGE_SEARCH_SSE2)
+  while (end - p >= 16) {
+    const __m128i block = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+    const __m128i white = _mm_or_si128(_mm_or_si128(_mm_cmpeq_epi8(block, _mm_set1_epi8(' ')),
+                                                    _mm_cmpeq_epi8(block, _mm_set1_epi8('\t'))),
+                                       _mm_or_si128(_mm_cmpeq_epi8(block, _mm_set1_epi8('\n')),
+                                                    _mm_cmpeq_epi8(block, _mm_set1_epi8('\r'))));
+    const unsigned other = ~static_cast<unsigned>(_mm_movemask_epi8(white)) & 0xffffu;
+    if (other != 0) return p + LowestBit(other);
+    p += 16;
+  }
+#endif
+  return SkipWhiteSpace(p, end);
 }
 
 // The bytes after the first one match the rest of the pattern.
@@ -85,17 +114,22 @@ inline const char* Find(const char* p, const char* end, const char* readable,
 #endif
 }
 
-// The first `c` among the sixteen bytes from p, or null when they hold none or the text ends
-// before them.
-inline const char* FindInNextSixteen(const char* p, const char* readable, char c) {
-  if (readable - p < 16) return nullptr;
+// The first occurrence of `pattern` starting among the sixteen bytes from p, or null when they
+// hold none or the text ends before an occurrence starting there would.
+inline const char* FindInNextSixteen(const char* p, const char* readable,
+                                     std::string_view pattern) {
+  if (readable - p < static_cast<std::ptrdiff_t>(15 + pattern.size())) return nullptr;
 #if defined(PACKAGE_SEARCH_SSE2)
   const __m128i block = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
-  const unsigned mask =
-      static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(block, _mm_set1_epi8(c))));
-  return mask != 0 ? p + LowestBit(mask) : nullptr;
+  unsigned mask =
+      static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(block, _mm_set1_epi8(pattern[0]))));
+  for (; mask != 0; mask &= mask - 1) {
+    const char* const candidate = p + LowestBit(mask);
+    if (RestMatches(candidate, pattern)) return candidate;
+  }
+  return nullptr;
 #else
-  return static_cast<const char*>(std::memchr(p, c, 16));
+  return FindFar(p, p + 16, pattern);
 #endif
 }
 
@@ -105,6 +139,38 @@ inline bool SameBytes(const char* p, const char* text, std::size_t length) {
     if (p[i] != text[i]) return false;
   }
   return true;
+}
+
+// strlen, one step for a short text in `field`, a fixed text field of at least sixteen bytes
+// (names are short, and the reader measures them again at every element).
+inline std::size_t TextLength(const char* text, const char* field) {
+#if defined(PACKAGE_SEARCH_SSE2)
+  if (text == field) {
+    const __m128i block = _mm_loadu_si128(reinterpret_cast<const __m128i*>(text));
+    const unsigned nul =
+        static_cast<unsigned>(_mm_movemask_epi8(_mm_cmpeq_epi8(block, _mm_setzero_si128())));
+    if (nul != 0) return LowestBit(nul);
+  }
+#else
+  (void)field;
+#endif
+  return std::strlen(text);
+}
+
+// SameBytes for at most eight bytes, where eight bytes are readable at both p and text: one
+// comparison of the first eight, those past `length` left out.
+inline bool SameFewBytes(const char* p, const char* text, std::size_t length) {
+  if constexpr (std::endian::native == std::endian::little) {
+    std::uint64_t a;
+    std::uint64_t b;
+    std::memcpy(&a, p, sizeof(a));
+    std::memcpy(&b, text, sizeof(b));
+    const std::uint64_t wanted =
+        length >= 8 ? ~std::uint64_t{0} : (std::uint64_t{1} << 8 * length) - 1;
+    return ((a ^ b) & wanted) == 0;
+  } else {
+    return SameBytes(p, text, length);
+  }
 }
 
 }  // namespace pattern_search

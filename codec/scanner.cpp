@@ -16,6 +16,30 @@ bool StartsWith(std::string_view text, const char* prefix) {
   return text.substr(0, std::strlen(prefix)) == prefix;
 }
 
+// The rest of Find, out of line: the sixteen bytes ahead hold most delimiters, and their path
+// then saves and restores no more than it uses.
+template <typename Memo>
+PACKAGE_SEARCH_NOINLINE const char* FindBeyondSixteen(std::string_view pattern, const char* from,
+                                                      const char* textEnd, const char* bufferStart,
+                                                      Memo* memo) {
+  constexpr std::ptrdiff_t kNear = 16;
+  if (static_cast<std::size_t>(textEnd - from) < pattern.size()) return nullptr;
+  const char* const lastStart = textEnd - pattern.size() + 1;
+  const int cursor = static_cast<int>(from - bufferStart);
+  const char* const nearEnd = from + std::min(kNear, lastStart - from);
+  if (const char* found = pattern_search::Find(from, nearEnd, textEnd, pattern)) return found;
+
+  if (memo && memo->from <= cursor && (memo->found < 0 || cursor <= memo->found)) {
+    return memo->found < 0 ? nullptr : bufferStart + memo->found;
+  }
+  constexpr std::ptrdiff_t kFar = 256;
+  const char* const farEnd = nearEnd + std::min(kFar, lastStart - nearEnd);
+  const char* found = pattern_search::Find(nearEnd, farEnd, textEnd, pattern);
+  if (!found) found = pattern_search::FindFar(farEnd, lastStart, pattern);
+  if (memo) *memo = {cursor, found ? static_cast<int>(found - bufferStart) : -1};
+  return found;
+}
+
 }  // namespace
 
 // The memo of the delimiters the readers use; others go unremembered.
@@ -39,28 +63,9 @@ Lum_DataPackage::DelimiterMemo* Lum_DataPackage::MemoFor(std::string_view patter
 // that mostly move forward; remembering the last answer for each keeps a missing or far delimiter
 // from being searched for over and over.
 const char* Lum_DataPackage::Find(std::string_view pattern) {
-  constexpr std::ptrdiff_t kNear = 16;
   const char* const from = bufferStart + bufferCursor;
-  if (pattern.size() == 1) {
-    if (const char* found = pattern_search::FindInNextSixteen(from, textEnd, pattern[0])) {
-      return found;
-    }
-  }
-  if (static_cast<std::size_t>(textEnd - from) < pattern.size()) return nullptr;
-  const char* const lastStart = textEnd - pattern.size() + 1;
-  const char* const nearEnd = from + std::min(kNear, lastStart - from);
-  if (const char* found = pattern_search::Find(from, nearEnd, textEnd, pattern)) return found;
-
-  DelimiterMemo* memo = MemoFor(pattern);
-  if (memo && memo->from <= bufferCursor && (memo->found < 0 || bufferCursor <= memo->found)) {
-    return memo->found < 0 ? nullptr : bufferStart + memo->found;
-  }
-  constexpr std::ptrdiff_t kFar = 256;
-  const char* const farEnd = nearEnd + std::min(kFar, lastStart - nearEnd);
-  const char* found = pattern_search::Find(nearEnd, farEnd, textEnd, pattern);
-  if (!found) found = pattern_search::FindFar(farEnd, lastStart, pattern);
-  if (memo) *memo = {bufferCursor, found ? static_cast<int>(found - bufferStart) : -1};
-  return found;
+  if (const char* found = pattern_search::FindInNextSixteen(from, textEnd, pattern)) return found;
+  return FindBeyondSixteen(pattern, from, textEnd, bufferStart, MemoFor(pattern));
 }
 
 // A new text, or a new end to it, makes everything learnt about the old one wrong.
@@ -181,8 +186,9 @@ int Lum_DataPackage::GetItemType(char* name) {
   int type = 0;
   MovePast("<");
   skipWhiteSpace();
-  const std::size_t nameLength = std::strlen(name);
-  if (StartsWith(rest(), name) && rest().size() > nameLength) {
+  const std::size_t nameLength = pattern_search::TextLength(name, tagName);
+  if (rest().size() > nameLength &&
+      pattern_search::SameBytes(bufferStart + bufferCursor, name, nameLength)) {
     skip(nameLength);
     skipWhiteSpace();
     if (rest().starts_with("id")) {

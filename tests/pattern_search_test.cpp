@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstring>
 #include <random>
 #include <string>
 #include <string_view>
@@ -46,10 +47,9 @@ TEST(PatternSearchTest, FindsWhatAByteByByteSearchFinds) {
             EXPECT_EQ(pattern_search::Find(p, end, readable, pattern), Naive(p, end, pattern));
             EXPECT_EQ(pattern_search::FindFar(p, end, pattern), Naive(p, end, pattern));
           }
-          if (pattern.size() == 1) {
-            const char* const expected = readable - p < 16 ? nullptr : Naive(p, p + 16, pattern);
-            EXPECT_EQ(pattern_search::FindInNextSixteen(p, readable, pattern[0]), expected);
-          }
+          const bool room = readable - p >= static_cast<std::ptrdiff_t>(15 + pattern.size());
+          EXPECT_EQ(pattern_search::FindInNextSixteen(p, readable, pattern),
+                    room ? Naive(p, p + 16, pattern) : nullptr);
         }
       }
     }
@@ -63,13 +63,45 @@ TEST(PatternSearchTest, SkipsWhiteSpaceUpToItsEnd) {
     std::string white;
     for (std::size_t i = 0; i < run; ++i)
       white += " \t\r\n"[i % 4];
-    for (const std::string& text : {white, white + "\v", white + "x  "}) {
+    for (const std::string& text :
+         {white, white + "\v", white + "x  ", white + std::string(1, '\0'), white + "\xa0" + white,
+          white + "\f" + white}) {
       const GuardedBuffer guarded(text);
       const char* const end = guarded.data() + guarded.size();
-      EXPECT_EQ(pattern_search::SkipWhiteSpace(guarded.data(), end), guarded.data() + run) << run;
-      EXPECT_EQ(pattern_search::SkipWhiteSpace(guarded.data(), guarded.data() + run / 2),
-                guarded.data() + run / 2);
+      for (const auto skip : {pattern_search::SkipWhiteSpace, pattern_search::SkipIndentation}) {
+        EXPECT_EQ(skip(guarded.data(), end), guarded.data() + run) << run;
+        EXPECT_EQ(skip(guarded.data(), guarded.data() + run / 2), guarded.data() + run / 2);
+      }
     }
+  }
+}
+
+TEST(PatternSearchTest, ComparesFewBytesAsSameBytesDoes) {
+  // Eight readable bytes on both sides, differing at every place or nowhere, for every length.
+  const std::string base = "Position";
+  for (std::size_t length = 0; length <= 8; ++length) {
+    for (std::size_t differs = 0; differs <= 8; ++differs) {
+      std::string other = base;
+      if (differs < 8) other[differs] = static_cast<char>(other[differs] ^ 0x80);
+      const GuardedBuffer a(base);
+      const GuardedBuffer b(other);
+      EXPECT_EQ(pattern_search::SameFewBytes(a.data(), b.data(), length),
+                pattern_search::SameBytes(a.data(), b.data(), length))
+          << length << " " << differs;
+      EXPECT_EQ(pattern_search::SameBytes(a.data(), b.data(), length), differs >= length);
+    }
+  }
+}
+
+TEST(PatternSearchTest, MeasuresTextsInAFieldAsStrlenDoes) {
+  // Lengths on both sides of the sixteen-byte step, in the field and elsewhere.
+  char field[64];
+  for (std::size_t length = 0; length < sizeof(field); ++length) {
+    std::memset(field, 'n', sizeof(field));
+    field[length] = '\0';
+    EXPECT_EQ(pattern_search::TextLength(field, field), length);
+    const GuardedBuffer elsewhere(std::string(field, length + 1));
+    EXPECT_EQ(pattern_search::TextLength(elsewhere.data(), field), length);
   }
 }
 
