@@ -9,8 +9,8 @@ sizes and on nested packages of several depths. Run by hand, not in CI:
 
 Each package is made by `datapack pack` from a generated JSON. Times are CPU seconds, user and
 system, the best of --repeat runs: other work on the machine disturbs them little. Per byte, they
-count the bytes the command reads (the JSON text for pack, both packages for diff) and leave out
-the program's start (the best time of showing the demo package, loading the plug-ins included).
+count the package's bytes (both packages' for diff; pack writes the package) and leave out the
+program's start (the best time of showing the demo package, loading the plug-ins included).
 Memory is the peak resident set; the last column is that peak less the program's own (its peak
 showing the demo package), per byte of package.
 """
@@ -102,17 +102,18 @@ def measure(datapack, work, name, description, repeat, commands):
     rows = []
     for label, arguments in commands:
         arguments = [a.format(pkg=package, json=shown, other=other) for a in arguments]
-        # What the command reads: pack a JSON text, diff two packages, the others one package.
-        read = sum(os.path.getsize(a) for a in arguments if a in (package, shown, other))
+        # The packages a command handles: diff reads two, pack writes one, the others read one.
+        handled = size * max(1, sum(a in (package, other) for a in arguments))
         best = None
         for _ in range(repeat):
             seconds, peak = run([datapack] + arguments)
             best = (seconds, peak) if best is None or seconds < best[0] else best
-        rows.append((label, read, best[0], best[1]))
+        rows.append((label, handled, best[0], best[1]))
+    json_size = os.path.getsize(shown)
     for path in (source, shown, other):
         os.remove(path)
     os.remove(package)
-    return size, rows
+    return size, json_size, rows
 
 
 def main():
@@ -149,14 +150,16 @@ def main():
     start, base = min(run([datapack, "show", demo]) for _ in range(5))
     print("start-up %.1f ms, peak %.1f MB" % (start * 1e3, base / MB))
     print("%-22s %-12s %10s %10s %9s %12s %9s %9s %9s" % (
-        "package", "command", "bytes", "read", "seconds", "ns/byte read", "peak MB", "peak/size",
+        "package", "command", "bytes", "handled", "seconds", "ns/byte", "peak MB", "peak/size",
         "above/size"))
     for title, name, description in cases:
-        size, rows = measure(datapack, work, name, description, options.repeat, commands)
-        for label, read, seconds, peak in rows:
+        size, json_size, rows = measure(datapack, work, name, description, options.repeat,
+                                        commands)
+        print("%s: %d bytes of package, %d of JSON from show --json" % (title, size, json_size))
+        for label, handled, seconds, peak in rows:
             print("%-22s %-12s %10d %10d %9.3f %12.1f %9.1f %9.2f %9.2f" %
-                  (title, label, size, read, seconds, (seconds - start) * 1e9 / read, peak / MB,
-                   peak / size, (peak - base) / size))
+                  (title, label, size, handled, seconds, (seconds - start) * 1e9 / handled,
+                   peak / MB, peak / size, (peak - base) / size))
             sys.stdout.flush()
         description.clear()
 
