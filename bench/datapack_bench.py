@@ -74,8 +74,9 @@ def nested(depth, size):
 
 
 def run(command, stdin_path=None, stdout_path=os.devnull):
-    """CPU seconds (user and system) and peak resident bytes of one run; the exit status must be 0 or 1. GNU time
-    takes the peak: a child of this process would count the interpreter's pages as its own."""
+    """CPU seconds (user and system) and peak resident bytes of one run, whose exit status must
+    be 0 or 1. GNU time takes the peak: a child of this process would count the interpreter's
+    pages as its own."""
     with open(stdin_path or os.devnull, "rb") as stdin, open(stdout_path, "wb") as stdout:
         before = resource.getrusage(resource.RUSAGE_CHILDREN)
         result = subprocess.run(["/usr/bin/time", "-f", "%M"] + command, stdin=stdin,
