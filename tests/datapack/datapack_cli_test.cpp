@@ -232,6 +232,12 @@ TEST(DatapackCliTest, RefusesWhatThePackageCannotCarryUnlessForced) {
     EXPECT_EQ(forced.status, 0) << c.message << "\n" << forced.err;
     EXPECT_NE(forced.out, "");
   }
+  // Standard input is not held while the package is written, so reading back names no line.
+  const RunResult piped = RunDatapack({"pack"}, nested);
+  EXPECT_EQ(piped.status, 1);
+  EXPECT_NE(piped.err.find("datapack: standard input: A: 2 entries read back as 1"),
+            std::string::npos)
+      << piped.err;
 }
 
 TEST(DatapackCliTest, ShowWarnsWhereTheReaderTakesFewerEntriesThanTheTextHolds) {

@@ -350,8 +350,9 @@ void Pack(const PackOptions& options) {
   // A regular file is parsed as it is read; any trouble, and it is read whole for the message.
   std::optional<Package> streamed;
   std::error_code error;
-  if (!IsStandardStream(options.file) && std::filesystem::is_regular_file(options.file, error) &&
-      std::filesystem::file_size(options.file, error) <= kLargestInput) {
+  const bool regular =
+      !IsStandardStream(options.file) && std::filesystem::is_regular_file(options.file, error);
+  if (regular && std::filesystem::file_size(options.file, error) <= kLargestInput) {
     streamed = PackageFromJsonFile(options.file);
   }
   if (streamed) {
@@ -368,11 +369,15 @@ void Pack(const PackOptions& options) {
   if (options.scramble) package.scrambled = true;
 
   const auto refuse = [&](const std::vector<Problem>& problems, bool forceable) {
-    if (text.empty()) text = ReadInput(options.file);
+    if (text.empty() && regular) text = ReadInput(options.file);
     Places places(name, text);
     std::string message;
     for (const Problem& problem : problems) {
-      message += places.At(JsonError(problem.pointer, "").OffsetIn(text)) + problem.message + "\n";
+      // A stream's text is gone by the last check, the one that reads the package back: its
+      // message names the path without a line.
+      message +=
+          (text.empty() ? name + ": " : places.At(JsonError(problem.pointer, "").OffsetIn(text))) +
+          problem.message + "\n";
     }
     throw InputError(message + (forceable ? "the package cannot carry this; --force writes it all "
                                             "the same"
@@ -382,8 +387,9 @@ void Pack(const PackOptions& options) {
   if (!options.force && !problems.empty()) refuse(problems, true);
   std::erase_if(problems, [](const Problem& problem) { return problem.forceable; });
   if (!problems.empty()) refuse(problems, false);
-  // A file can be read again for a message; the package needs the room meanwhile.
-  if (!IsStandardStream(options.file)) std::string().swap(text);
+  // The package needs the room: a file can be read again for a message, and a stream's last
+  // message can do without its line.
+  std::string().swap(text);
 
   const Plugins plugins = LoadPlugins(pluginDir);
   std::string bytes = WritePackage(plugins, package, false);
