@@ -27,7 +27,11 @@ PACKAGE_SEARCH_NOINLINE const char* FindBeyondSixteen(std::string_view pattern, 
   const char* const lastStart = textEnd - pattern.size() + 1;
   const int cursor = static_cast<int>(from - bufferStart);
   const char* const nearEnd = from + std::min(kNear, lastStart - from);
-  if (const char* found = pattern_search::Find(from, nearEnd, textEnd, pattern)) return found;
+  // With room for the whole block, FindInNextSixteen has looked at these starts already.
+  const bool nearSeen = textEnd - from >= static_cast<std::ptrdiff_t>(15 + pattern.size());
+  if (!nearSeen) {
+    if (const char* found = pattern_search::Find(from, nearEnd, textEnd, pattern)) return found;
+  }
 
   if (memo && memo->from <= cursor && (memo->found < 0 || cursor <= memo->found)) {
     return memo->found < 0 ? nullptr : bufferStart + memo->found;
