@@ -254,6 +254,26 @@ TEST(DatapackCliTest, ShowWarnsWhereTheReaderTakesFewerEntriesThanTheTextHolds) 
                             "P[0].did, the reader takes 0"),
             std::string::npos)
       << result.err;
+
+  // Entries the reader does not take are passed over whole, however much they hold: Q still
+  // gets its own place.
+  std::string skipped = "\n<T>\n";
+  for (const char* id : {"0", "1"}) {
+    skipped += std::string("\t<P id=\"") + id +
+               "\">\n\t\t<d>\n\t\t\t<v Type=\"Val\"> 1 </v>\n\t\t</d>"
+               "\n\t\t<did id=\"0\">\n\t\t\t<s>\n\t\t\t</s>\n\t\t</did>"
+               "\n\t\t<did id=\"1\">\n\t\t\t<s>\n\t\t\t</s>\n\t\t</did>\n\t</P>\n";
+  }
+  skipped +=
+      "\t<Q>\n\t\t<e>\n\t\t\t<w Type=\"Val\"> 2 </w>\n\t\t</e>\n\t\t<eid id=\"0\">"
+      "\n\t\t</eid>\n\t</Q>\n</T>";
+  const RunResult past = RunDatapack({"show", "-"}, skipped);
+  EXPECT_EQ(past.status, 0) << past.err;
+  for (const char* warning :
+       {":3:2: warning: the text holds 2 entries of T[0].P, the reader takes 1",
+        ":29:2: warning: the text holds 1 entry of T[0].Q, the reader takes 0"}) {
+    EXPECT_NE(past.err.find(warning), std::string::npos) << past.err;
+  }
 }
 
 TEST(DatapackCliTest, ScramblingIsUndoneByteForByteThroughFilesAndStreams) {

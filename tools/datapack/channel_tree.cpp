@@ -108,6 +108,8 @@ struct ChannelTree::Node {
   void CollectEntry() {
     if (progress) progress->Update(++handled);
     Entry entry;
+    entry.values.reserve(data.size());
+    entry.directories.reserve(directories.size());
     for (std::size_t i = 0; i < data.size(); ++i)
       entry.values.push_back(GetValue(i));
     for (const auto& sub : directories) {
@@ -141,7 +143,7 @@ struct ChannelTree::Node {
         static_cast<Lum_VectorChannel&>(channel).SetVector(std::get<D3DXVECTOR3>(value));
         break;
       case Kind::kMatrix:
-        static_cast<Lum_MatrixChannel&>(channel).SetMatrix(std::get<D3DXMATRIX>(value));
+        static_cast<Lum_MatrixChannel&>(channel).SetMatrix(*std::get<Matrix>(value));
         break;
     }
   }
@@ -160,7 +162,7 @@ struct ChannelTree::Node {
       case Kind::kMatrix:
         break;
     }
-    return static_cast<Lum_MatrixChannel&>(channel).GetMatrix();
+    return Matrix(static_cast<Lum_MatrixChannel&>(channel).GetMatrix());
   }
 };
 

@@ -165,7 +165,7 @@ class ToJson {
     if (const auto* text = std::get_if<std::string>(&value)) return Text(*text);
     if (const auto* number = std::get_if<float>(&value)) return Number(*number);
     if (const auto* vector = std::get_if<D3DXVECTOR3>(&value)) return Numbers(&vector->x, 3);
-    const auto& matrix = std::get<D3DXMATRIX>(value);
+    const D3DXMATRIX& matrix = *std::get<datapack::Matrix>(value);
     return Array(kMatrixRows,
                  [&matrix](std::size_t r) { return Numbers(matrix.m[r], kMatrixRows); });
   }
@@ -412,6 +412,7 @@ class FromJson {
  private:
   std::vector<Entry> Entries(const datapack::Shape& shape, const Json& json, const Place& place) {
     std::vector<Entry> entries;
+    entries.reserve(Array(json, place).size());
     for (std::size_t i = 0; i < Array(json, place).size(); ++i)
       entries.push_back(EntryFrom(shape, json[i], place.Entry(i)));
     return entries;
@@ -426,6 +427,7 @@ class FromJson {
     const Json* values = Find(json, item, kValuesKey);
     if (!shape.data.empty() && !values) Fail(item, "an entry without \"values\"");
     if (values) Array(*values, item.Key(kValuesKey), shape.data.size());
+    entry.values.reserve(shape.data.size());
     for (std::size_t j = 0; j < shape.data.size(); ++j) {
       const Place value = item.Key(kValuesKey).Item(j).Named(shape.data[j].name);
       entry.values.push_back(Value(shape.data[j].kind, (*values)[j], value));
@@ -433,6 +435,7 @@ class FromJson {
     const Json* directories = Find(json, item, kDirectoriesKey);
     if (!shape.directories.empty() && !directories) Fail(item, "an entry without \"directories\"");
     if (directories) Array(*directories, item.Key(kDirectoriesKey), shape.directories.size());
+    entry.directories.reserve(shape.directories.size());
     for (std::size_t k = 0; k < shape.directories.size(); ++k) {
       const datapack::Shape& sub = shape.directories[k];
       const Place list = item.Key(kDirectoriesKey).Item(k).Named(sub.name);
@@ -462,7 +465,7 @@ class FromJson {
       for (int c = 0; c < kMatrixRows; ++c)
         matrix.m[r][c] = Number(row[c], place);
     }
-    return matrix;
+    return datapack::Matrix(matrix);
   }
 
   bool latin1_ = false;

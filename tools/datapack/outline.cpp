@@ -66,7 +66,7 @@ std::string ValueText(const Value& value) {
   if (const auto* text = std::get_if<std::string>(&value)) return Quoted(*text);
   if (const float* number = std::get_if<float>(&value)) return Number(*number);
   if (const auto* vector = std::get_if<D3DXVECTOR3>(&value)) return Numbers(&vector->x, 3);
-  return Numbers(&std::get<D3DXMATRIX>(value).m[0][0], 16);
+  return Numbers(std::get<Matrix>(value).Numbers(), 16);
 }
 
 namespace {

@@ -29,7 +29,7 @@ Value DefaultValue(Kind kind) {
     case Kind::kMatrix:
       break;
   }
-  return D3DXMATRIX{};
+  return Matrix();
 }
 
 bool WrittenEmpty(const Shape& shape, const std::vector<Entry>& entries) {

@@ -2,6 +2,7 @@
 // entry hands to the engine.
 #pragma once
 
+#include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -33,7 +34,26 @@ struct Shape {
   bool operator==(const Shape&) const = default;
 };
 
-using Value = std::variant<std::string, float, D3DXVECTOR3, D3DXMATRIX>;
+// A matrix held apart from its value: a value is as large as its largest kind, and most values
+// are texts and numbers. Copies copy the matrix; a moved-from one holds none and may only be
+// destroyed or assigned.
+class Matrix {
+ public:
+  Matrix(const D3DXMATRIX& matrix = {}) : matrix_(std::make_unique<D3DXMATRIX>(matrix)) {}
+  Matrix(const Matrix& other) : Matrix(*other) {}
+  Matrix(Matrix&&) noexcept = default;
+  Matrix& operator=(const Matrix& other) { return *this = Matrix(other); }
+  Matrix& operator=(Matrix&&) noexcept = default;
+  ~Matrix() = default;
+
+  const D3DXMATRIX& operator*() const { return *matrix_; }
+  const float* Numbers() const { return &matrix_->m[0][0]; }
+
+ private:
+  std::unique_ptr<D3DXMATRIX> matrix_;
+};
+
+using Value = std::variant<std::string, float, D3DXVECTOR3, Matrix>;
 
 Value DefaultValue(Kind kind);
 

@@ -48,23 +48,25 @@ class Way {
   std::size_t index_ = 0;
 };
 
-void FindShortfalls(const FoundDirectory& found, const Shape& shape,
+// Compares the directory element at `at` in `found`, and those inside it; leaves `at` past them.
+void FindShortfalls(const std::vector<FoundDirectory>& found, std::size_t& at, const Shape& shape,
                     const std::vector<Entry>& entries, const Way& place,
                     std::vector<Shortfall>& out) {
-  if (found.entries.size() != entries.size()) {
-    out.push_back({found.offset, "the text holds " +
-                                     Counted(found.entries.size(), "entry", "entries") + " of " +
-                                     ShownPath(place.Made().Path()) + ", the reader takes " +
-                                     std::to_string(entries.size())});
+  const FoundDirectory& directory = found[at++];
+  if (directory.entries != entries.size()) {
+    out.push_back({directory.offset, "the text holds " +
+                                         Counted(directory.entries, "entry", "entries") + " of " +
+                                         ShownPath(place.Made().Path()) + ", the reader takes " +
+                                         std::to_string(entries.size())});
   }
-  for (std::size_t i = 0; i < std::min(found.entries.size(), entries.size()); ++i) {
+  for (std::size_t i = 0; i < std::min<std::size_t>(directory.entries, entries.size()); ++i) {
     const Way entry = place.Entry(i);
     for (std::size_t k = 0; k < shape.directories.size(); ++k) {
       const Shape& sub = shape.directories[k];
-      FindShortfalls(found.entries[i][k], sub, entries[i].directories[k], entry.Named(sub.name),
-                     out);
+      FindShortfalls(found, at, sub, entries[i].directories[k], entry.Named(sub.name), out);
     }
   }
+  at = directory.end;  // past the entries the reader did not take
 }
 
 // Numbers compare as the package writes them.
@@ -79,7 +81,7 @@ std::string Written(const Value& value) {
   if (const float* number = std::get_if<float>(&value)) return Written(*number);
   const float* numbers = std::holds_alternative<D3DXVECTOR3>(value)
                              ? &std::get<D3DXVECTOR3>(value).x
-                             : &std::get<D3DXMATRIX>(value).m[0][0];
+                             : std::get<Matrix>(value).Numbers();
   const std::size_t count = std::holds_alternative<D3DXVECTOR3>(value) ? 3 : 16;
   std::string out;
   for (std::size_t i = 0; i < count; ++i)
@@ -87,17 +89,21 @@ std::string Written(const Value& value) {
   return out;
 }
 
+// The bytes of a value's numbers.
+std::string_view NumberBytes(const Value& value) {
+  const auto bytes = [](const auto* numbers, std::size_t size) {
+    return std::string_view(reinterpret_cast<const char*>(numbers), size);
+  };
+  if (const float* number = std::get_if<float>(&value)) return bytes(number, sizeof(float));
+  if (const auto* vector = std::get_if<D3DXVECTOR3>(&value)) return bytes(vector, sizeof(*vector));
+  return bytes(std::get<Matrix>(value).Numbers(), sizeof(D3DXMATRIX));
+}
+
 // Values compare as the package writes them; most are simply the same.
 bool SameWritten(const Value& meant, const Value& read) {
-  if (meant.index() == read.index() && !std::holds_alternative<std::string>(meant)) {
-    const auto bytes = [](const Value& value) {
-      return std::visit(
-          [](const auto& v) {
-            return std::string_view(reinterpret_cast<const char*>(&v), sizeof(v));
-          },
-          value);
-    };
-    if (bytes(meant) == bytes(read)) return true;
+  if (meant.index() == read.index() && !std::holds_alternative<std::string>(meant) &&
+      NumberBytes(meant) == NumberBytes(read)) {
+    return true;
   }
   return Written(meant) == Written(read);
 }
@@ -176,7 +182,7 @@ ReadResult ReadPackage(const Plugins& plugins, std::string& text, const EntrySin
   std::function<void(Entry &&)> each;
   if (sink) each = [&](Entry&& entry) { sink(structure.top, std::move(entry)); };
   result.package.entries = ChannelTree(plugins, structure.top)
-                               .Read(text, structure.crlf, each, structure.found.entries.size());
+                               .Read(text, structure.crlf, each, structure.found.front().entries);
   result.package.header = std::move(structure.header);
   result.package.crlf = structure.crlf;
   result.notes = std::move(structure.notes);
@@ -188,7 +194,9 @@ ReadResult ReadPackage(const Plugins& plugins, std::string& text, const EntrySin
 std::vector<Shortfall> FindShortfalls(const ReadResult& result) {
   std::vector<Shortfall> shortfalls;
   const Place top = Place().Named(result.package.top.name);
-  FindShortfalls(result.found, result.package.top, result.package.entries, Way(top), shortfalls);
+  std::size_t at = 0;
+  FindShortfalls(result.found, at, result.package.top, result.package.entries, Way(top),
+                 shortfalls);
   return shortfalls;
 }
 

@@ -17,7 +17,7 @@ namespace datapack {
 
 struct ReadResult {
   Package package;
-  FoundDirectory found;  // the entries the text holds, read or not
+  std::vector<FoundDirectory> found;  // the entries the text holds, read or not
   std::vector<Note> notes;
 };
 

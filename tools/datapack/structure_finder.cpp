@@ -77,7 +77,8 @@ class Parser {
   const std::vector<datapack::Note>& Notes() const { return notes_; }
   std::optional<std::size_t> FirstBreak(bool crlf) const { return firstBreak[crlf]; }
 
-  FoundDirectory Directory(Layout& layout, int depth = 1) {
+  // Adds the directory element ahead, and those inside it, to Found().
+  void Directory(Layout& layout, int depth = 1) {
     const Tag open = Take();
     if (open.closing || open.kind) Fail(open, "expected a directory element");
     if (depth > Lum_DataPackage::kMaxNesting) {
@@ -92,38 +93,40 @@ class Parser {
     } else if (open.name != layout.name) {
       Fail(open, "expected the directory " + Quoted(layout.name) + " as in the entries before");
     }
-    FoundDirectory found{open.offset, {}};
+    const std::size_t index = found_.size();
+    found_.push_back({open.offset, 0, 0});
+    std::uint32_t entries = 0;
     if (!open.hasId) {
       const std::optional<Tag> next = Peek();
       if (next && next->closing && next->name == open.name) {
         Take();  // an empty element: it tells nothing of what an entry holds
-        path_.resize(pathLength);
-        return found;
+      } else {
+        EntryContents(layout, entries++, depth);
+        Close(open.name);
       }
-      found.entries.push_back(EntryContents(layout, 0, depth));
-      Close(open.name);
-      path_.resize(pathLength);
-      return found;
-    }
-    for (Tag tag = open;;) {
-      const std::size_t index = found.entries.size();
-      if (tag.id != index) {
-        Notice(tag.offset, true,
-               "id " + std::to_string(tag.id) + " on entry " + std::to_string(index) +
-                   ": ids are not read, and the writer numbers entries from 0");
+    } else {
+      for (Tag tag = open;;) {
+        if (tag.id != entries) {
+          Notice(tag.offset, true,
+                 "id " + std::to_string(tag.id) + " on entry " + std::to_string(entries) +
+                     ": ids are not read, and the writer numbers entries from 0");
+        }
+        EntryContents(layout, entries++, depth);
+        Close(open.name);
+        const std::optional<Tag> next = Peek();
+        if (!next || next->closing || next->kind || !next->hasId || next->name != open.name) break;
+        tag = Take();
       }
-      found.entries.push_back(EntryContents(layout, index, depth));
-      Close(open.name);
-      const std::optional<Tag> next = Peek();
-      if (!next || next->closing || next->kind || !next->hasId || next->name != open.name) break;
-      tag = Take();
+      if (entries > static_cast<std::uint32_t>(Lum_DataPackage::kMaxReadEntries)) {
+        Notice(open.offset, false, EntryCountProblem(entries));
+      }
     }
-    if (found.entries.size() > static_cast<std::size_t>(Lum_DataPackage::kMaxReadEntries)) {
-      Notice(open.offset, false, EntryCountProblem(found.entries.size()));
-    }
+    found_[index].entries = entries;
+    found_[index].end = static_cast<std::uint32_t>(found_.size());
     path_.resize(pathLength);
-    return found;
   }
+
+  std::vector<FoundDirectory>& Found() { return found_; }
 
  private:
   [[noreturn]] static void Fail(std::size_t offset, const std::string& message) {
@@ -252,16 +255,15 @@ class Parser {
     return std::nullopt;
   }
 
-  std::vector<FoundDirectory> EntryContents(Layout& layout, std::size_t index, int depth) {
+  void EntryContents(Layout& layout, std::size_t index, int depth) {
     const std::size_t pathLength = path_.size();
     path_ += "[" + std::to_string(index) + "]";
-    std::vector<FoundDirectory> subs = Contents(layout, depth);
+    Contents(layout, depth);
     path_.resize(pathLength);
-    return subs;
   }
 
-  // One entry: its data elements, then its sub-directories. Returns the sub-directories found.
-  std::vector<FoundDirectory> Contents(Layout& layout, int depth) {
+  // One entry: its data elements, then its sub-directories.
+  void Contents(Layout& layout, int depth) {
     const std::size_t start = at_;
     std::vector<DataSlot> data;
     for (std::optional<Tag> next = Peek(); next && next->kind; next = Peek()) {
@@ -275,28 +277,28 @@ class Parser {
       Fail(start, "an entry of " + Quoted(layout.name) +
                       " holds other data elements than the entries before it");
     }
-    std::vector<FoundDirectory> subs;
+    std::size_t subs = 0;
     for (std::optional<Tag> next = Peek(); next && !next->closing; next = Peek()) {
       if (!layout.filled) {
         layout.directories.emplace_back();
-      } else if (subs.size() == layout.directories.size()) {
+      } else if (subs == layout.directories.size()) {
         Fail(*next, "an entry of " + Quoted(layout.name) +
                         " holds more sub-directories than the entries before it");
       }
-      subs.push_back(Directory(layout.directories[subs.size()], depth + 1));
+      Directory(layout.directories[subs++], depth + 1);
     }
-    if (layout.filled && subs.size() != layout.directories.size()) {
+    if (layout.filled && subs != layout.directories.size()) {
       Fail(at_, "an entry of " + Quoted(layout.name) +
                     " holds fewer sub-directories than the entries before it");
     }
     layout.filled = true;
-    return subs;
   }
 
   std::string_view text_;
   std::size_t at_;
   std::string path_;
   std::vector<datapack::Note> notes_;
+  std::vector<FoundDirectory> found_;
 };
 
 }  // namespace
@@ -330,12 +332,12 @@ Structure FindStructure(std::string_view text) {
       if (!tag || tag->closing || tag->kind || tag->name != name) continue;
       ++attempts;
       Layout layout;
-      FoundDirectory found = parser.Directory(layout);
+      parser.Directory(layout);
       if (!parser.AtEnd()) throw StructureError(parser.At(), "text after the directory's end");
       std::string_view header = text.substr(0, at);
       const std::string_view newline = crlf ? "\r\n" : "\n";
       if (header.ends_with(newline)) header.remove_suffix(newline.size());
-      Structure structure{std::string(header), crlf, layout.ToShape(), std::move(found),
+      Structure structure{std::string(header), crlf, layout.ToShape(), std::move(parser.Found()),
                           parser.Notes()};
       // The reader takes either line break; writing again gives one kind only.
       if (const auto other = parser.FirstBreak(!crlf)) {

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -13,10 +14,13 @@
 
 namespace datapack {
 
-// The entries of one directory element as the text holds them, before any reader sees them.
+// One directory element as the text holds it, before any reader sees it. A package's are listed
+// in the order they open: each is followed by those inside its entries, entry by entry. A list
+// rather than a tree: small entries would cost several times their text as vectors.
 struct FoundDirectory {
-  std::size_t offset = 0;                            // of its first opening tag
-  std::vector<std::vector<FoundDirectory>> entries;  // per entry, its sub-directories
+  std::size_t offset = 0;  // of its first opening tag
+  std::uint32_t entries = 0;
+  std::uint32_t end = 0;  // the index in the list past those inside it
 };
 
 // What the reader would take otherwise than the text holds it, noticed on the way.
@@ -30,7 +34,7 @@ struct Structure {
   std::string header;
   bool crlf = false;
   Shape top;
-  FoundDirectory found;
+  std::vector<FoundDirectory> found;  // the first is the top directory
   std::vector<Note> notes;
 };
 
