@@ -37,7 +37,7 @@ Lum_StringChannel& AsText(Vorn_Channel& channel) {
 }  // namespace
 
 // One DataDirectory with the channels on its links. Writing, `supply` holds the entries to hand
-// out; reading, each entry read is added to `collected`.
+// out; reading, each entry read is added to `table`.
 struct ChannelTree::Node {
   ChannelHandle directory;
   ChannelHandle tag;
@@ -47,10 +47,10 @@ struct ChannelTree::Node {
   std::vector<Kind> kinds;
   std::vector<ChannelHandle> data;
   std::vector<std::unique_ptr<Node>> directories;
-  const std::vector<Entry>* supply = nullptr;
-  std::vector<Entry> collected;
-  std::function<void(Entry&&)> sink;  // takes each entry instead of `collected`
-  Progress* progress = nullptr;       // counts the entries of the top directory
+  Entries supply;
+  Table* table = nullptr;
+  std::function<void(Entry)> sink;  // takes each entry, which is then dropped
+  Progress* progress = nullptr;     // counts the entries of the top directory
   std::uint64_t handled = 0;
 
   Node(const Plugins& plugins, const Shape& shape)
@@ -91,50 +91,45 @@ struct ChannelTree::Node {
   // Before the writer packs an entry: its values, and the entries of each sub-directory in it.
   void SupplyEntry() {
     if (progress) progress->Update(++handled);
-    const Entry& entry = (*supply)[static_cast<std::size_t>(index.GetValue())];
+    const Entry entry = supply[static_cast<std::size_t>(index.GetValue())];
     for (std::size_t i = 0; i < data.size(); ++i)
-      SetValue(i, entry.values[i]);
+      SetValue(i, entry);
     for (std::size_t i = 0; i < directories.size(); ++i)
-      directories[i]->Supply(entry.directories[i]);
+      directories[i]->Supply(entry.Directory(i));
   }
 
-  void Supply(const std::vector<Entry>& entries) {
-    supply = &entries;
+  void Supply(Entries entries) {
+    supply = entries;
     count.SetValue(static_cast<float>(entries.size()));
     callEachIteration.SetCallback([this] { SupplyEntry(); });
   }
 
-  // After the reader has filled an entry: its values, and what each sub-directory took meanwhile.
+  // After the reader has filled an entry: its values. Each sub-directory has added its entries
+  // meanwhile.
   void CollectEntry() {
     if (progress) progress->Update(++handled);
-    Entry entry;
-    entry.values.reserve(data.size());
-    entry.directories.reserve(directories.size());
     for (std::size_t i = 0; i < data.size(); ++i)
-      entry.values.push_back(GetValue(i));
-    for (const auto& sub : directories) {
-      entry.directories.push_back(std::move(sub->collected));
-      sub->collected.clear();
-    }
+      AddValue(i);
+    table->EndEntry();
     if (sink) {
-      sink(std::move(entry));
-    } else {
-      collected.push_back(std::move(entry));
+      sink(table->All()[table->size() - 1]);
+      table->Clear();
     }
   }
 
-  void Collect() {
-    collected.clear();
+  void Collect(Table& into) {
+    table = &into;
     callEachIteration.SetCallback([this] { CollectEntry(); });
-    for (const auto& sub : directories)
-      sub->Collect();
+    for (std::size_t k = 0; k < directories.size(); ++k)
+      directories[k]->Collect(into.Directory(k));
   }
 
-  void SetValue(std::size_t i, const Value& value) {
+  void SetValue(std::size_t i, const Entry& entry) {
     Vorn_Channel& channel = *data[i];
+    const Value value = entry.Value(i);
     switch (kinds[i]) {
       case Kind::kText:
-        AsText(channel).SetString(std::get<std::string>(value).c_str());
+        AsText(channel).SetString(entry.Text(i));
         break;
       case Kind::kValue:
         static_cast<Lum_ValueChannel&>(channel).SetValue(std::get<float>(value));
@@ -143,26 +138,30 @@ struct ChannelTree::Node {
         static_cast<Lum_VectorChannel&>(channel).SetVector(std::get<D3DXVECTOR3>(value));
         break;
       case Kind::kMatrix:
-        static_cast<Lum_MatrixChannel&>(channel).SetMatrix(*std::get<Matrix>(value));
+        static_cast<Lum_MatrixChannel&>(channel).SetMatrix(*std::get<const D3DXMATRIX*>(value));
         break;
     }
   }
 
-  Value GetValue(std::size_t i) {
+  void AddValue(std::size_t i) {
     Vorn_Channel& channel = *data[i];
     switch (kinds[i]) {
       case Kind::kText: {
         const char* text = AsText(channel).GetString();
-        return std::string(text ? text : "");
+        table->Add(i, std::string_view(text ? text : ""));
+        return;
       }
       case Kind::kValue:
-        return static_cast<Lum_ValueChannel&>(channel).GetValue();
+        table->Add(i, static_cast<Lum_ValueChannel&>(channel).GetValue());
+        return;
       case Kind::kVector:
-        return static_cast<Lum_VectorChannel&>(channel).GetVector();
+        table->Add(i, static_cast<Lum_VectorChannel&>(channel).GetVector());
+        return;
       case Kind::kMatrix:
         break;
     }
-    return Matrix(static_cast<Lum_MatrixChannel&>(channel).GetMatrix());
+    const D3DXMATRIX matrix = static_cast<Lum_MatrixChannel&>(channel).GetMatrix();
+    table->Add(i, &matrix);
   }
 };
 
@@ -171,8 +170,8 @@ ChannelTree::ChannelTree(const Plugins& plugins, const Shape& top)
 
 ChannelTree::~ChannelTree() = default;
 
-std::string ChannelTree::Write(const std::string& header, const std::vector<Entry>& entries,
-                               bool crlf, bool scramble) {
+std::string ChannelTree::Write(const std::string& header, Entries entries, bool crlf,
+                               bool scramble) {
   Lum_DataPackage& directory = top_->Directory();
   directory.SetString(header.c_str());
   top_->Supply(entries);
@@ -196,11 +195,11 @@ std::string ChannelTree::Write(const std::string& header, const std::vector<Entr
   return buffer;
 }
 
-std::vector<Entry> ChannelTree::Read(std::string& text, bool crlf,
-                                     const std::function<void(Entry&&)>& sink,
-                                     std::size_t expected) {
+void ChannelTree::Read(std::string& text, bool crlf, Table& into,
+                       const std::function<void(Entry)>& sink, std::size_t expected) {
   if (text.size() >= INT_MAX) throw InputError("the package is too large to be read");
-  top_->Collect();
+  into.Clear();
+  top_->Collect(into);
   top_->sink = sink;
   Progress progress("reading the package", expected);
   top_->progress = &progress;
@@ -208,12 +207,11 @@ std::vector<Entry> ChannelTree::Read(std::string& text, bool crlf,
   plugins_.ReadFromBuffer(top_->Directory(), text.data(), static_cast<int>(text.size() + 1), !crlf,
                           false);
   top_->progress = nullptr;
-  return std::move(top_->collected);
 }
 
 std::string WritePackage(const Plugins& plugins, const Package& package, bool scramble) {
   return ChannelTree(plugins, package.top)
-      .Write(package.header, package.entries, package.crlf, scramble);
+      .Write(package.header, package.entries(), package.crlf, scramble);
 }
 
 }  // namespace datapack

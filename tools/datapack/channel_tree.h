@@ -24,17 +24,16 @@ class ChannelTree {
 
   // The package of these entries, measured first and then written into a buffer of exactly the
   // measured size; returned without its NUL.
-  std::string Write(const std::string& header, const std::vector<Entry>& entries, bool crlf,
-                    bool scramble);
+  std::string Write(const std::string& header, Entries entries, bool crlf, bool scramble);
 
-  // The entries the tree receives from reading the text, read where it stands: the reader only
-  // looks, and the string's own terminating NUL ends it.
-  // With a sink, each entry of the top directory goes there once read instead, and nothing is
-  // returned: the entries need never be held all at once.
+  // Adds to `into`, a table of the tree's shape, emptied first, the entries the tree receives
+  // from reading the text, read where it stands: the reader only looks, and the string's own
+  // terminating NUL ends it.
+  // With a sink, each entry of the top directory goes there once read and is then dropped: the
+  // entries need never be held all at once.
   // `expected`, the number of entries the text holds, measures the progress shown.
-  std::vector<Entry> Read(std::string& text, bool crlf,
-                          const std::function<void(Entry&&)>& sink = nullptr,
-                          std::size_t expected = 0);
+  void Read(std::string& text, bool crlf, Table& into,
+            const std::function<void(Entry)>& sink = nullptr, std::size_t expected = 0);
 
  private:
   struct Node;

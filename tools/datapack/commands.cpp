@@ -178,16 +178,28 @@ std::vector<Finding> Findings(Loaded& loaded, const Plugins& plugins) {
   return findings;
 }
 
-std::string Path(const std::string& path, std::string_view name) {
-  const std::string shown = ShownName(name);
-  return path.empty() ? shown : path + "." + shown;
-}
-
 // The differences between two packages, by path.
 class Differ {
  public:
-  explicit Differ(Output& out) : out_(out) {}
+  // `top` is the path of the top directory.
+  Differ(Output& out, std::string top) : out_(out), path_(std::move(top)) {}
   bool different = false;
+
+  // Goes one step further down the path for as long as it lives. Paths grow with depth: a path
+  // made afresh at each level would cost memory with the square of the depth.
+  class Step {
+   public:
+    Step(Differ& differ, std::string_view more) : path_(differ.path_), size_(path_.size()) {
+      path_ += more;
+    }
+    ~Step() { path_.resize(size_); }
+    Step(const Step&) = delete;
+    Step& operator=(const Step&) = delete;
+
+   private:
+    std::string& path_;
+    std::size_t size_;
+  };
 
   void Report(const std::string& path, const std::string& before, const std::string& after) {
     different = true;
@@ -195,9 +207,9 @@ class Differ {
   }
 
   // Whether the two directories' names and data channels allow comparing their entries.
-  bool Shapes(const Shape& a, const Shape& b, const std::string& path) {
+  bool Shapes(const Shape& a, const Shape& b) {
     if (a.name != b.name) {
-      Report(path, "directory \"" + ShownName(a.name) + "\"",
+      Report(path_, "directory \"" + ShownName(a.name) + "\"",
              "directory \"" + ShownName(b.name) + "\"");
       return false;
     }
@@ -208,50 +220,54 @@ class Differ {
     };
     for (std::size_t j = 0; j < std::max(a.data.size(), b.data.size()); ++j) {
       if (j >= a.data.size() || j >= b.data.size() || a.data[j] != b.data[j]) {
-        Report(path + ".data[" + std::to_string(j) + "]", slot(a, j), slot(b, j));
+        Report(path_ + ".data[" + std::to_string(j) + "]", slot(a, j), slot(b, j));
       }
     }
     return true;
   }
 
-  void Entries(std::size_t before, std::size_t after, const std::string& path) {
+  void EntryCounts(std::size_t before, std::size_t after) {
     if (before != after) {
-      Report(path, Counted(before, "entry", "entries"), Counted(after, "entry", "entries"));
+      Report(path_, Counted(before, "entry", "entries"), Counted(after, "entry", "entries"));
     }
   }
 
-  void EntryValues(const Shape& a, const Entry& aEntry, const Shape& b, const Entry& bEntry,
-                   const std::string& entry) {
+  // Two entries at the path.
+  void EntryValues(const Shape& a, Entry aEntry, const Shape& b, Entry bEntry) {
     for (std::size_t j = 0; j < std::min(a.data.size(), b.data.size()); ++j) {
       if (a.data[j] != b.data[j]) continue;
-      const std::string before = ValueText(aEntry.values[j]);
-      const std::string after = ValueText(bEntry.values[j]);
-      if (before != after) Report(Path(entry, a.data[j].name), before, after);
+      const std::string before = ValueText(aEntry.Value(j));
+      const std::string after = ValueText(bEntry.Value(j));
+      if (before != after) Report(Below(a.data[j].name), before, after);
     }
     const std::size_t subs = std::max(a.directories.size(), b.directories.size());
     for (std::size_t k = 0; k < subs; ++k) {
       if (k >= a.directories.size() || k >= b.directories.size()) {
         const Shape& only = k < a.directories.size() ? a.directories[k] : b.directories[k];
-        Report(Path(entry, only.name), k < a.directories.size() ? "a directory" : "nothing",
+        Report(Below(only.name), k < a.directories.size() ? "a directory" : "nothing",
                k < a.directories.size() ? "nothing" : "a directory");
         continue;
       }
-      Directory(a.directories[k], aEntry.directories[k], b.directories[k], bEntry.directories[k],
-                entry);
+      const Step step(*this, "." + ShownName(a.directories[k].name));
+      Directory(a.directories[k], aEntry.Directory(k), b.directories[k], bEntry.Directory(k));
     }
   }
 
-  void Directory(const Shape& a, const std::vector<Entry>& aEntries, const Shape& b,
-                 const std::vector<Entry>& bEntries, const std::string& parent) {
-    const std::string path = Path(parent, a.name);
-    if (!Shapes(a, b, path)) return;
-    Entries(aEntries.size(), bEntries.size(), path);
-    for (std::size_t i = 0; i < std::min(aEntries.size(), bEntries.size()); ++i)
-      EntryValues(a, aEntries[i], b, bEntries[i], path + "[" + std::to_string(i) + "]");
+  // Two directories' entries at the path.
+  void Directory(const Shape& a, Entries aEntries, const Shape& b, Entries bEntries) {
+    if (!Shapes(a, b)) return;
+    EntryCounts(aEntries.size(), bEntries.size());
+    for (std::size_t i = 0; i < std::min(aEntries.size(), bEntries.size()); ++i) {
+      const Step step(*this, "[" + std::to_string(i) + "]");
+      EntryValues(a, aEntries[i], b, bEntries[i]);
+    }
   }
 
  private:
+  std::string Below(std::string_view name) const { return path_ + "." + ShownName(name); }
+
   Output& out_;
+  std::string path_;
 };
 
 }  // namespace
@@ -437,24 +453,24 @@ int Diff(const DiffOptions& options) {
   Loaded before = Load(options.before, options.scrambling, plugins);
   std::string().swap(before.text);
   const Package& a = before.result.package;
-  const std::string path = ShownName(a.top.name);
+  const Entries aEntries = a.entries();
   Output out("");
-  Differ differ(out);
+  Differ differ(out, ShownName(a.top.name));
   // The second package's entries are compared as they are read, and dropped.
   std::size_t count = 0;
   bool comparable = false;
-  const auto compare = [&](const Shape& top, Entry&& entry) {
-    if (count == 0) comparable = differ.Shapes(a.top, top, path);
-    if (comparable && count < a.entries.size()) {
-      differ.EntryValues(a.top, a.entries[count], top, entry,
-                         path + "[" + std::to_string(count) + "]");
+  const auto compare = [&](const Shape& top, Entry entry) {
+    if (count == 0) comparable = differ.Shapes(a.top, top);
+    if (comparable && count < aEntries.size()) {
+      const Differ::Step step(differ, "[" + std::to_string(count) + "]");
+      differ.EntryValues(a.top, aEntries[count], top, entry);
     }
     ++count;
   };
   const Loaded after = Load(options.after, options.scrambling, plugins, compare);
   const Package& b = after.result.package;
-  if (count == 0) comparable = differ.Shapes(a.top, b.top, path);
-  if (comparable) differ.Entries(a.entries.size(), count, path);
+  if (count == 0) comparable = differ.Shapes(a.top, b.top);
+  if (comparable) differ.EntryCounts(aEntries.size(), count);
   if (a.header != b.header) differ.Report("header", ValueText(a.header), ValueText(b.header));
   if (a.crlf != b.crlf) {
     differ.Report("line breaks", a.crlf ? "CRLF" : "LF", b.crlf ? "CRLF" : "LF");

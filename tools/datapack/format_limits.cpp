@@ -71,10 +71,9 @@ std::optional<std::string> HeaderProblem(std::string_view header, std::string_vi
 
 // Looking for one more entry of a directory, the reader takes the next tag that starts with its
 // name followed by "id", and reads no further to tell.
-std::optional<std::string> SiblingProblem(const Shape& before,
-                                          const std::vector<Entry>& beforeEntries,
-                                          const Shape& next, const std::vector<Entry>& entries) {
-  if (WrittenEmpty(before, beforeEntries) || !next.name.starts_with(before.name)) {
+std::optional<std::string> SiblingProblem(const Shape& before, Entries beforeEntries,
+                                          const Shape& next, Entries entries) {
+  if (WrittenEmpty(before, beforeEntries.size()) || !next.name.starts_with(before.name)) {
     return std::nullopt;
   }
   std::string_view rest = std::string_view(next.name).substr(before.name.size());
@@ -115,7 +114,7 @@ class Checker {
       CheckShape(shape.directories[k], named.Key(kDirectoriesKey).Item(k), depth + 1);
   }
 
-  void CheckEntries(const Shape& shape, const std::vector<Entry>& entries, const Place& list) {
+  void CheckEntries(const Shape& shape, Entries entries, const Place& list) {
     if (entries.size() > static_cast<std::size_t>(Lum_DataPackage::kMaxReadEntries)) {
       Report(list, EntryCountProblem(entries.size()));
     } else if (entries.size() > 1) {
@@ -130,8 +129,8 @@ class Checker {
     for (std::size_t i = 0; i < entries.size(); ++i) {
       const Place entry = list.Entry(i);
       for (std::size_t j = 0; j < shape.data.size(); ++j) {
-        const auto* text = std::get_if<std::string>(&entries[i].values[j]);
-        if (text) {
+        const Value value = entries[i].Value(j);
+        if (const auto* text = std::get_if<std::string_view>(&value)) {
           Report(entry.Key(kValuesKey).Item(j).Named(shape.data[j].name), TextProblem(*text));
         }
       }
@@ -140,10 +139,10 @@ class Checker {
         const Place subList = entry.Key(kDirectoriesKey).Item(k).Named(sub.name);
         if (k > 0) {
           const Shape& before = shape.directories[k - 1];
-          Report(subList, SiblingProblem(before, entries[i].directories[k - 1], sub,
-                                         entries[i].directories[k]));
+          Report(subList,
+                 SiblingProblem(before, entries[i].Directory(k - 1), sub, entries[i].Directory(k)));
         }
-        CheckEntries(sub, entries[i].directories[k], subList);
+        CheckEntries(sub, entries[i].Directory(k), subList);
       }
     }
   }
@@ -182,7 +181,8 @@ std::vector<Problem> CheckLimits(const Package& package) {
                  HeaderProblem(package.header, package.top.name));
   const Place top = root.Key(kDirectoryKey);
   checker.CheckShape(package.top, top, 0);
-  checker.CheckEntries(package.top, package.entries, top.Named(package.top.name).Key(kEntriesKey));
+  checker.CheckEntries(package.top, package.entries(),
+                       top.Named(package.top.name).Key(kEntriesKey));
   return checker.problems;
 }
 

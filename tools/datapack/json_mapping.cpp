@@ -58,8 +58,9 @@ class ToJson {
  public:
   explicit ToJson(bool latin1) : latin1_(latin1) {}
 
-  View Text(const std::string& bytes) const {
-    return Scalar(Quoted(latin1_ ? Latin1ToUtf8(bytes) : bytes));
+  View Text(std::string_view bytes) const {
+    if (latin1_) return Scalar(Quoted(Latin1ToUtf8(bytes)));
+    return Scalar(Quoted(bytes));
   }
 
   // As the JSON library writes strings, without making one of its documents for each.
@@ -119,7 +120,7 @@ class ToJson {
     return Array(count, [numbers](std::size_t i) { return Number(numbers[i]); });
   }
 
-  View Shape(const datapack::Shape& shape, const std::vector<Entry>* entries) const {
+  View Shape(const datapack::Shape& shape, const datapack::Entries* entries) const {
     std::vector<std::string_view> keys = {kNameKey, kDataKey, kDirectoriesKey};
     if (entries) keys.push_back(kEntriesKey);
     return Object(std::move(keys), [this, &shape, entries](std::size_t i) {
@@ -139,33 +140,36 @@ class ToJson {
             return Shape(shape.directories[k], nullptr);
           });
       }
-      return Entries(shape, *entries);
+      return EntryList(shape, *entries);
     });
   }
 
-  View Entries(const datapack::Shape& shape, const std::vector<Entry>& entries) const {
-    return Array(entries.size(), [this, &shape, &entries](std::size_t i) {
-      const Entry& entry = entries[i];
+  View EntryList(const datapack::Shape& shape, datapack::Entries entries) const {
+    return Array(entries.size(), [this, &shape, entries](std::size_t i) {
+      const Entry entry = entries[i];
       std::vector<std::string_view> keys;
       if (!shape.data.empty()) keys.push_back(kValuesKey);
       if (!shape.directories.empty()) keys.push_back(kDirectoriesKey);
-      return Object(std::move(keys), [this, &shape, &entry](std::size_t k) {
+      return Object(std::move(keys), [this, &shape, entry](std::size_t k) {
         if (k == 0 && !shape.data.empty()) {
-          return Array(entry.values.size(),
-                       [this, &entry](std::size_t j) { return Value(entry.values[j]); });
+          return Array(shape.data.size(),
+                       [this, entry](std::size_t j) { return Value(entry.Value(j)); });
         }
-        return Array(shape.directories.size(), [this, &shape, &entry](std::size_t j) {
-          return Entries(shape.directories[j], entry.directories[j]);
+        return Array(shape.directories.size(), [this, &shape, entry](std::size_t j) {
+          return EntryList(shape.directories[j], entry.Directory(j));
         });
       });
     });
   }
 
   View Value(const datapack::Value& value) const {
-    if (const auto* text = std::get_if<std::string>(&value)) return Text(*text);
+    if (const auto* text = std::get_if<std::string_view>(&value)) return Text(*text);
     if (const auto* number = std::get_if<float>(&value)) return Number(*number);
-    if (const auto* vector = std::get_if<D3DXVECTOR3>(&value)) return Numbers(&vector->x, 3);
-    const D3DXMATRIX& matrix = *std::get<datapack::Matrix>(value);
+    if (const auto* vector = std::get_if<D3DXVECTOR3>(&value)) {
+      // A vector is held in the value, which the view outlives.
+      return Array(3, [xyz = *vector](std::size_t i) { return Number((&xyz.x)[i]); });
+    }
+    const D3DXMATRIX& matrix = *std::get<const D3DXMATRIX*>(value);
     return Array(kMatrixRows,
                  [&matrix](std::size_t r) { return Numbers(matrix.m[r], kMatrixRows); });
   }
@@ -185,15 +189,15 @@ bool AllUtf8(const datapack::Shape& shape) {
   return true;
 }
 
-bool AllUtf8(const std::vector<Entry>& entries) {
-  for (const Entry& entry : entries) {
-    for (const Value& value : entry.values) {
-      const auto* text = std::get_if<std::string>(&value);
-      if (text && !IsUtf8(*text)) return false;
+bool AllUtf8(const Table& table, const datapack::Shape& shape) {
+  for (std::size_t j = 0; j < shape.data.size(); ++j) {
+    if (shape.data[j].kind != Kind::kText) continue;
+    for (std::size_t i = 0; i < table.size(); ++i) {
+      if (!IsUtf8(std::get<std::string_view>(table.At(i, j)))) return false;
     }
-    for (const auto& sub : entry.directories) {
-      if (!AllUtf8(sub)) return false;
-    }
+  }
+  for (std::size_t k = 0; k < shape.directories.size(); ++k) {
+    if (!AllUtf8(table.Directory(k), shape.directories[k])) return false;
   }
   return true;
 }
@@ -296,9 +300,10 @@ class FromJson {
     if (!directory) Fail(place, "no \"directory\"");
     const Place top = place.Key(kDirectoryKey);
     package.top = Shape(*directory, top, 0);
+    package.table = Table(package.top);
     if (const Json* entries = Find(*directory, top, kEntriesKey)) {
-      package.entries =
-          Entries(package.top, *entries, top.Named(package.top.name).Key(kEntriesKey));
+      AddEntries(package.top, package.table, *entries,
+                 top.Named(package.top.name).Key(kEntriesKey));
     }
     return package;
   }
@@ -410,50 +415,50 @@ class FromJson {
   }
 
  private:
-  std::vector<Entry> Entries(const datapack::Shape& shape, const Json& json, const Place& place) {
-    std::vector<Entry> entries;
-    entries.reserve(Array(json, place).size());
+  void AddEntries(const datapack::Shape& shape, Table& table, const Json& json,
+                  const Place& place) {
     for (std::size_t i = 0; i < Array(json, place).size(); ++i)
-      entries.push_back(EntryFrom(shape, json[i], place.Entry(i)));
-    return entries;
+      AddEntry(shape, table, json[i], place.Entry(i));
   }
 
  public:
   bool latin1() const { return latin1_; }
 
-  Entry EntryFrom(const datapack::Shape& shape, const Json& json, const Place& item) {
+  void AddEntry(const datapack::Shape& shape, Table& table, const Json& json, const Place& item) {
     Keys(json, item, {kValuesKey, kDirectoriesKey});
-    Entry entry;
     const Json* values = Find(json, item, kValuesKey);
     if (!shape.data.empty() && !values) Fail(item, "an entry without \"values\"");
     if (values) Array(*values, item.Key(kValuesKey), shape.data.size());
-    entry.values.reserve(shape.data.size());
     for (std::size_t j = 0; j < shape.data.size(); ++j) {
       const Place value = item.Key(kValuesKey).Item(j).Named(shape.data[j].name);
-      entry.values.push_back(Value(shape.data[j].kind, (*values)[j], value));
+      AddValue(table, j, shape.data[j].kind, (*values)[j], value);
     }
     const Json* directories = Find(json, item, kDirectoriesKey);
     if (!shape.directories.empty() && !directories) Fail(item, "an entry without \"directories\"");
     if (directories) Array(*directories, item.Key(kDirectoriesKey), shape.directories.size());
-    entry.directories.reserve(shape.directories.size());
     for (std::size_t k = 0; k < shape.directories.size(); ++k) {
       const datapack::Shape& sub = shape.directories[k];
       const Place list = item.Key(kDirectoriesKey).Item(k).Named(sub.name);
-      entry.directories.push_back(Entries(sub, (*directories)[k], list));
+      AddEntries(sub, table.Directory(k), (*directories)[k], list);
     }
-    return entry;
+    table.EndEntry();
   }
 
  private:
-  datapack::Value Value(Kind kind, const Json& json, const Place& place) const {
+  void AddValue(Table& table, std::size_t slot, Kind kind, const Json& json,
+                const Place& place) const {
     switch (kind) {
       case Kind::kText:
-        return Text(json, place);
+        table.Add(slot, std::string_view(Text(json, place)));
+        return;
       case Kind::kValue:
-        return Number(json, place);
+        table.Add(slot, Number(json, place));
+        return;
       case Kind::kVector: {
         const Json& xyz = Array(json, place, 3);
-        return D3DXVECTOR3{Number(xyz[0], place), Number(xyz[1], place), Number(xyz[2], place)};
+        table.Add(slot,
+                  D3DXVECTOR3{Number(xyz[0], place), Number(xyz[1], place), Number(xyz[2], place)});
+        return;
       }
       case Kind::kMatrix:
         break;
@@ -465,13 +470,13 @@ class FromJson {
       for (int c = 0; c < kMatrixRows; ++c)
         matrix.m[r][c] = Number(row[c], place);
     }
-    return datapack::Matrix(matrix);
+    table.Add(slot, &matrix);
   }
 
   bool latin1_ = false;
 };
 
-// The JSON text parsed with each entry of the top directory made into an Entry as soon as it is
+// The JSON text parsed with each entry of the top directory added to its table as soon as it is
 // complete and dropped from the document: the document never holds the package's values. That
 // needs the directory's shape and the encoding before its entries, as show --json prints them;
 // other texts are read whole.
@@ -489,7 +494,7 @@ class StreamedReader {
     Package package = from.Read(root);
     if (streamed_) {
       if (from.latin1() != latin1_ || package.top != *shape_) throw Unstreamable();
-      package.entries = std::move(entries_);
+      package.table = std::move(*table_);
     }
     return package;
   }
@@ -551,12 +556,12 @@ class StreamedReader {
       if (!shape_) {
         if (frames_[2].count != 0 || !parts_.contains(kNameKey)) return true;
         shape_ = FromJson(latin1_).Shape(parts_, top_, 0);
+        table_.emplace(*shape_);
       }
       if (!streamed_ && frames_[2].count != 0) return true;
       streamed_ = true;
       const Place list = top_.Named(shape_->name).Key(kEntriesKey);
-      entries_.push_back(
-          FromJson(latin1_).EntryFrom(*shape_, parsed, list.Entry(frames_[2].count)));
+      FromJson(latin1_).AddEntry(*shape_, *table_, parsed, list.Entry(frames_[2].count));
       return false;
     }
     return true;
@@ -566,7 +571,7 @@ class StreamedReader {
   Json parts_ = Json::object();
   const Place top_ = Place().Key(kDirectoryKey);
   std::optional<datapack::Shape> shape_;
-  std::vector<Entry> entries_;
+  std::optional<Table> table_;  // the entries streamed, of `shape_`
   bool latin1_ = false;
   bool streamed_ = false;
 };
@@ -626,7 +631,9 @@ std::size_t JsonError::OffsetIn(std::string_view text) const {
 }
 
 void WritePackageJson(const Package& package, Output& out) {
-  const bool latin1 = !IsUtf8(package.header) || !AllUtf8(package.top) || !AllUtf8(package.entries);
+  const bool latin1 =
+      !IsUtf8(package.header) || !AllUtf8(package.top) || !AllUtf8(package.table, package.top);
+  const Entries entries = package.entries();
   const ToJson to(latin1);
   std::vector<std::string_view> keys = {kHeaderKey, kLineBreaksKey, kEncodingKey};
   if (package.scrambled) keys.push_back(kScrambledKey);
@@ -641,7 +648,7 @@ void WritePackageJson(const Package& package, Output& out) {
         return Scalar(ToJson::Quoted(latin1 ? kLatin1 : kUtf8));
     }
     if (i == 3 && package.scrambled) return Scalar("true");
-    return to.Shape(package.top, &package.entries);
+    return to.Shape(package.top, &entries);
   });
   Printer(out).Print(root, 0);
   out << "\n";

@@ -11,7 +11,7 @@ namespace {
 
 // C escapes for what a terminal would not show as it is; bytes of texts that are not UTF-8 as
 // hexadecimal escapes.
-std::string Escaped(const std::string& text) {
+std::string Escaped(std::string_view text) {
   const bool utf8 = IsUtf8(text);
   std::string out;
   for (char c : text) {
@@ -45,7 +45,7 @@ std::string Escaped(const std::string& text) {
   return out;
 }
 
-std::string Quoted(const std::string& text) { return "\"" + Escaped(text) + "\""; }
+std::string Quoted(std::string_view text) { return "\"" + Escaped(text) + "\""; }
 
 // The fewest digits that give the same float back.
 std::string Number(float number) {
@@ -63,16 +63,15 @@ std::string Numbers(const float* numbers, int count) {
 }  // namespace
 
 std::string ValueText(const Value& value) {
-  if (const auto* text = std::get_if<std::string>(&value)) return Quoted(*text);
+  if (const auto* text = std::get_if<std::string_view>(&value)) return Quoted(*text);
   if (const float* number = std::get_if<float>(&value)) return Number(*number);
   if (const auto* vector = std::get_if<D3DXVECTOR3>(&value)) return Numbers(&vector->x, 3);
-  return Numbers(std::get<Matrix>(value).Numbers(), 16);
+  return Numbers(&std::get<const D3DXMATRIX*>(value)->m[0][0], 16);
 }
 
 namespace {
 
-void Directory(const Shape& shape, const std::vector<Entry>& entries, const std::string& indent,
-               Output& out) {
+void Directory(const Shape& shape, Entries entries, const std::string& indent, Output& out) {
   out << indent << Escaped(shape.name) << ": " << Counted(entries.size(), "entry", "entries")
       << "\n";
   const std::string inner = indent + "    ";
@@ -80,10 +79,10 @@ void Directory(const Shape& shape, const std::vector<Entry>& entries, const std:
     out << indent << "  entry " << std::to_string(i) << "\n";
     for (std::size_t j = 0; j < shape.data.size(); ++j) {
       out << inner << Escaped(shape.data[j].name) << " (" << KindName(shape.data[j].kind)
-          << "): " << ValueText(entries[i].values[j]) << "\n";
+          << "): " << ValueText(entries[i].Value(j)) << "\n";
     }
     for (std::size_t k = 0; k < shape.directories.size(); ++k)
-      Directory(shape.directories[k], entries[i].directories[k], inner, out);
+      Directory(shape.directories[k], entries[i].Directory(k), inner, out);
   }
 }
 
@@ -97,7 +96,7 @@ void WriteOutline(const Package& package, Output& out) {
   out << "header: " << Quoted(package.header) << "\n";
   out << "line breaks: " << (package.crlf ? "CRLF" : "LF") << "\n";
   if (package.scrambled) out << "scrambled\n";
-  Directory(package.top, package.entries, "", out);
+  Directory(package.top, package.entries(), "", out);
 }
 
 }  // namespace datapack

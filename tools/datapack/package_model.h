@@ -2,7 +2,7 @@
 // entry hands to the engine.
 #pragma once
 
-#include <memory>
+#include <cstddef>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -34,44 +34,99 @@ struct Shape {
   bool operator==(const Shape&) const = default;
 };
 
-// A matrix held apart from its value: a value is as large as its largest kind, and most values
-// are texts and numbers. Copies copy the matrix; a moved-from one holds none and may only be
-// destroyed or assigned.
-class Matrix {
- public:
-  Matrix(const D3DXMATRIX& matrix = {}) : matrix_(std::make_unique<D3DXMATRIX>(matrix)) {}
-  Matrix(const Matrix& other) : Matrix(*other) {}
-  Matrix(Matrix&&) noexcept = default;
-  Matrix& operator=(const Matrix& other) { return *this = Matrix(other); }
-  Matrix& operator=(Matrix&&) noexcept = default;
-  ~Matrix() = default;
+// A value where it is held: a text or a matrix is seen in place.
+using Value = std::variant<std::string_view, float, D3DXVECTOR3, const D3DXMATRIX*>;
 
-  const D3DXMATRIX& operator*() const { return *matrix_; }
-  const float* Numbers() const { return &matrix_->m[0][0]; }
+class Table;
+class Entry;
+
+// Entries of one directory, in order: a run of its table's.
+class Entries {
+ public:
+  Entries() = default;
+  Entries(const Table& table, std::size_t first, std::size_t count)
+      : table_(&table), first_(first), count_(count) {}
+
+  std::size_t size() const { return count_; }
+  bool empty() const { return count_ == 0; }
+  std::size_t first() const { return first_; }
+  Entry operator[](std::size_t i) const;
 
  private:
-  std::unique_ptr<D3DXMATRIX> matrix_;
+  const Table* table_ = nullptr;
+  std::size_t first_ = 0;
+  std::size_t count_ = 0;
 };
 
-using Value = std::variant<std::string, float, D3DXVECTOR3, Matrix>;
+// One entry: its values, one per data slot, and the entries of each sub-directory in it.
+class Entry {
+ public:
+  Entry(const Table& table, std::size_t index) : table_(&table), index_(index) {}
 
-Value DefaultValue(Kind kind);
+  datapack::Value Value(std::size_t slot) const;
+  const char* Text(std::size_t slot) const;  // a text value, ended by a NUL
+  Entries Directory(std::size_t k) const;
 
-struct Entry {
-  std::vector<Value> values;                    // one per data slot
-  std::vector<std::vector<Entry>> directories;  // the entries of each sub-directory
+ private:
+  const Table* table_;
+  std::size_t index_;
 };
+
+// Every entry of one directory of the tree, across the package, in the order they were added:
+// a column of values per data slot, and per sub-directory where each entry's entries end in that
+// directory's table. Small entries would cost several times their text held one by one.
+class Table {
+ public:
+  Table() = default;
+  explicit Table(const Shape& shape);
+
+  std::size_t size() const { return size_; }
+  Entries All() const { return Entries(*this, 0, size_); }
+  const Table& Directory(std::size_t k) const { return directories_[k]; }
+  Table& Directory(std::size_t k) { return directories_[k]; }
+
+  Value At(std::size_t entry, std::size_t slot) const;
+  // A text value, ended by a NUL as channels take it.
+  const char* TextAt(std::size_t entry, std::size_t slot) const;
+  Entries DirectoryOf(std::size_t entry, std::size_t k) const;
+
+  // An entry is added value by value, its sub-directories' entries into their tables meanwhile,
+  // then ended.
+  void Add(std::size_t slot, const Value& value);
+  void EndEntry();
+  // Empties this table and those below it, keeping their room.
+  void Clear();
+
+ private:
+  struct Texts {
+    std::string bytes;              // each text followed by a NUL
+    std::vector<std::size_t> ends;  // of each text's NUL, plus one
+  };
+  using Column =
+      std::variant<Texts, std::vector<float>, std::vector<D3DXVECTOR3>, std::vector<D3DXMATRIX>>;
+
+  std::vector<Column> columns_;
+  std::vector<std::vector<std::size_t>> ends_;  // per sub-directory
+  std::vector<Table> directories_;
+  std::size_t size_ = 0;
+};
+
+inline Entry Entries::operator[](std::size_t i) const { return Entry(*table_, first_ + i); }
+inline Value Entry::Value(std::size_t slot) const { return table_->At(index_, slot); }
+inline const char* Entry::Text(std::size_t slot) const { return table_->TextAt(index_, slot); }
+inline Entries Entry::Directory(std::size_t k) const { return table_->DirectoryOf(index_, k); }
 
 struct Package {
   std::string header;
   bool crlf = false;
   bool scrambled = false;
   Shape top;
-  std::vector<Entry> entries;
+  Table table;  // of the top directory, holding those below
+  Entries entries() const { return table.All(); }
 };
 
 // True when a directory of this shape holding these entries is written as an empty element: no
 // entries, or a single one that holds nothing.
-bool WrittenEmpty(const Shape& shape, const std::vector<Entry>& entries);
+bool WrittenEmpty(const Shape& shape, std::size_t entries);
 
 }  // namespace datapack

@@ -50,8 +50,7 @@ class Way {
 
 // Compares the directory element at `at` in `found`, and those inside it; leaves `at` past them.
 void FindShortfalls(const std::vector<FoundDirectory>& found, std::size_t& at, const Shape& shape,
-                    const std::vector<Entry>& entries, const Way& place,
-                    std::vector<Shortfall>& out) {
+                    Entries entries, const Way& place, std::vector<Shortfall>& out) {
   const FoundDirectory& directory = found[at++];
   if (directory.entries != entries.size()) {
     out.push_back({directory.offset, "the text holds " +
@@ -63,7 +62,7 @@ void FindShortfalls(const std::vector<FoundDirectory>& found, std::size_t& at, c
     const Way entry = place.Entry(i);
     for (std::size_t k = 0; k < shape.directories.size(); ++k) {
       const Shape& sub = shape.directories[k];
-      FindShortfalls(found, at, sub, entries[i].directories[k], entry.Named(sub.name), out);
+      FindShortfalls(found, at, sub, entries[i].Directory(k), entry.Named(sub.name), out);
     }
   }
   at = directory.end;  // past the entries the reader did not take
@@ -77,11 +76,13 @@ std::string Written(float number) {
 }
 
 std::string Written(const Value& value) {
-  if (const auto* text = std::get_if<std::string>(&value)) return "\"" + *text + "\"";
+  if (const auto* text = std::get_if<std::string_view>(&value)) {
+    return "\"" + std::string(*text) + "\"";
+  }
   if (const float* number = std::get_if<float>(&value)) return Written(*number);
   const float* numbers = std::holds_alternative<D3DXVECTOR3>(value)
                              ? &std::get<D3DXVECTOR3>(value).x
-                             : std::get<Matrix>(value).Numbers();
+                             : &std::get<const D3DXMATRIX*>(value)->m[0][0];
   const std::size_t count = std::holds_alternative<D3DXVECTOR3>(value) ? 3 : 16;
   std::string out;
   for (std::size_t i = 0; i < count; ++i)
@@ -96,12 +97,12 @@ std::string_view NumberBytes(const Value& value) {
   };
   if (const float* number = std::get_if<float>(&value)) return bytes(number, sizeof(float));
   if (const auto* vector = std::get_if<D3DXVECTOR3>(&value)) return bytes(vector, sizeof(*vector));
-  return bytes(std::get<Matrix>(value).Numbers(), sizeof(D3DXMATRIX));
+  return bytes(std::get<const D3DXMATRIX*>(value), sizeof(D3DXMATRIX));
 }
 
 // Values compare as the package writes them; most are simply the same.
 bool SameWritten(const Value& meant, const Value& read) {
-  if (meant.index() == read.index() && !std::holds_alternative<std::string>(meant) &&
+  if (meant.index() == read.index() && !std::holds_alternative<std::string_view>(meant) &&
       NumberBytes(meant) == NumberBytes(read)) {
     return true;
   }
@@ -112,14 +113,12 @@ Problem Report(const Place& place, const std::string& message) {
   return Problem{place.Pointer(), ShownPath(place.Path()) + ": " + message};
 }
 
-std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& meantEntries,
-                                  const Shape& read, const std::vector<Entry>& readEntries,
-                                  const Way& list);
+std::optional<Problem> Difference(const Shape& meant, Entries meantEntries, const Shape& read,
+                                  Entries readEntries, const Way& list);
 
 // The first place where an entry read back differs from what was meant.
-std::optional<Problem> EntryDifference(const Shape& meant, const Entry& meantEntry,
-                                       const Shape& read, const Entry& readEntry,
-                                       const Way& entry) {
+std::optional<Problem> EntryDifference(const Shape& meant, Entry meantEntry, const Shape& read,
+                                       Entry readEntry, const Way& entry) {
   const Way values = entry.Key(kValuesKey);
   for (std::size_t j = 0; j < meant.data.size(); ++j) {
     const Way item = values.Item(j);
@@ -127,8 +126,8 @@ std::optional<Problem> EntryDifference(const Shape& meant, const Entry& meantEnt
     if (j >= read.data.size() || read.data[j] != meant.data[j]) {
       return Report(value.Made(), "the reader does not find this element");
     }
-    if (!SameWritten(meantEntry.values[j], readEntry.values[j])) {
-      return Report(value.Made(), "reads back as " + Written(readEntry.values[j]));
+    if (!SameWritten(meantEntry.Value(j), readEntry.Value(j))) {
+      return Report(value.Made(), "reads back as " + Written(readEntry.Value(j)));
     }
   }
   const Way directories = entry.Key(kDirectoriesKey);
@@ -139,8 +138,8 @@ std::optional<Problem> EntryDifference(const Shape& meant, const Entry& meantEnt
     if (k >= read.directories.size()) {
       return Report(subList.Made(), "the reader does not find this directory");
     }
-    if (auto problem = Difference(sub, meantEntry.directories[k], read.directories[k],
-                                  readEntry.directories[k], subList)) {
+    if (auto problem = Difference(sub, meantEntry.Directory(k), read.directories[k],
+                                  readEntry.Directory(k), subList)) {
       return problem;
     }
   }
@@ -156,11 +155,10 @@ std::optional<Problem> CountDifference(std::size_t meantCount, std::size_t readC
 }
 
 // The first place where what was read back differs from what was meant.
-std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& meantEntries,
-                                  const Shape& read, const std::vector<Entry>& readEntries,
-                                  const Way& list) {
-  const std::size_t meantCount = WrittenEmpty(meant, meantEntries) ? 0 : meantEntries.size();
-  const std::size_t readCount = WrittenEmpty(read, readEntries) ? 0 : readEntries.size();
+std::optional<Problem> Difference(const Shape& meant, Entries meantEntries, const Shape& read,
+                                  Entries readEntries, const Way& list) {
+  const std::size_t meantCount = WrittenEmpty(meant, meantEntries.size()) ? 0 : meantEntries.size();
+  const std::size_t readCount = WrittenEmpty(read, readEntries.size()) ? 0 : readEntries.size();
   if (meant.name != read.name) {
     return Report(list.Made(), "the name reads back as \"" + read.name + "\"");
   }
@@ -179,10 +177,11 @@ std::optional<Problem> Difference(const Shape& meant, const std::vector<Entry>& 
 ReadResult ReadPackage(const Plugins& plugins, std::string& text, const EntrySink& sink) {
   Structure structure = FindStructure(text);
   ReadResult result;
-  std::function<void(Entry &&)> each;
-  if (sink) each = [&](Entry&& entry) { sink(structure.top, std::move(entry)); };
-  result.package.entries = ChannelTree(plugins, structure.top)
-                               .Read(text, structure.crlf, each, structure.found.front().entries);
+  std::function<void(Entry)> each;
+  if (sink) each = [&](Entry entry) { sink(structure.top, entry); };
+  result.package.table = Table(structure.top);
+  ChannelTree(plugins, structure.top)
+      .Read(text, structure.crlf, result.package.table, each, structure.found.front().entries);
   result.package.header = std::move(structure.header);
   result.package.crlf = structure.crlf;
   result.notes = std::move(structure.notes);
@@ -195,7 +194,7 @@ std::vector<Shortfall> FindShortfalls(const ReadResult& result) {
   std::vector<Shortfall> shortfalls;
   const Place top = Place().Named(result.package.top.name);
   std::size_t at = 0;
-  FindShortfalls(result.found, at, result.package.top, result.package.entries, Way(top),
+  FindShortfalls(result.found, at, result.package.top, result.package.entries(), Way(top),
                  shortfalls);
   return shortfalls;
 }
@@ -221,20 +220,19 @@ std::optional<Problem> CheckReadBack(const Plugins& plugins, const Package& pack
   const bool holdsNothing = package.top.data.empty() && package.top.directories.empty();
   std::size_t count = 0;
   std::optional<Problem> first;
-  const auto compare = [&](Entry&& entry) {
+  const Entries meant = package.entries();
+  const auto compare = [&](Entry entry) {
     const std::size_t i = count++;
-    if (!first && i < package.entries.size()) {
-      first = EntryDifference(package.top, package.entries[i], structure.top, entry,
-                              Way(list).Entry(i));
+    if (!first && i < meant.size()) {
+      first = EntryDifference(package.top, meant[i], structure.top, entry, Way(list).Entry(i));
     }
   };
-  const std::vector<Entry> read =
-      ChannelTree(plugins, structure.top)
-          .Read(written, structure.crlf, holdsNothing ? nullptr : std::function(compare));
-  const std::size_t meantCount =
-      WrittenEmpty(package.top, package.entries) ? 0 : package.entries.size();
+  Table read(structure.top);
+  ChannelTree(plugins, structure.top)
+      .Read(written, structure.crlf, read, holdsNothing ? nullptr : std::function(compare));
+  const std::size_t meantCount = WrittenEmpty(package.top, meant.size()) ? 0 : meant.size();
   const std::size_t readCount =
-      holdsNothing ? (WrittenEmpty(structure.top, read) ? 0 : read.size()) : count;
+      holdsNothing ? (WrittenEmpty(structure.top, read.size()) ? 0 : read.size()) : count;
   if (auto problem = CountDifference(meantCount, readCount, list)) return problem;
   return first;
 }

@@ -23,8 +23,8 @@ struct ReadResult {
 
 // Throws StructureError when the text does not hold a package.
 // With a sink, each entry of the top directory goes there as it is read, with the top directory's
-// shape, and the result holds no entries.
-using EntrySink = std::function<void(const Shape& top, Entry&& entry)>;
+// shape, and the result holds no entries: an entry there lasts until the sink returns.
+using EntrySink = std::function<void(const Shape& top, Entry entry)>;
 ReadResult ReadPackage(const Plugins& plugins, std::string& text, const EntrySink& sink = nullptr);
 
 // Where the text holds another number of entries than the reader took.
