@@ -27,6 +27,15 @@ fs::path Folder() {
 #endif
   static const fs::path folder =
       fs::temp_directory_path() / ("datapack_test_" + std::to_string(pid));
+  // The folder goes when the program ends: every test program run left one behind.
+  struct Remover {
+    fs::path path;
+    ~Remover() {
+      std::error_code error;
+      fs::remove_all(path, error);
+    }
+  };
+  static const Remover remover{folder};
   return folder;
 }
 
