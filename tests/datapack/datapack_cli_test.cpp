@@ -364,6 +364,9 @@ TEST(DatapackCliTest, CheckListsWhatTheReaderWouldChangeAndDiffComparesByPath) {
        "6:1: warning: Players: id 7 on entry 1: ids are not read"},
       {replaced("</Name>\n", "</Name>\r\n"), 0, 1,
        "3:32: warning: mixed line breaks: CR LF in a package of LF"},
+      // Inside a value, just before its closing tag, after LF is known.
+      {replaced(" Ann </Name>", " Ann\r\n</Name>"), 0, 1,
+       "3:24: warning: mixed line breaks: CR LF in a package of LF"},
       {players + std::string(1, '\0') + "tail", 1, 1,
        ":9:11: error: 4 bytes after a NUL byte, where the reader stops"},
       {replaced("12.5", "12.50"), 0, 1, "warning: written again, the package differs"},

@@ -3,6 +3,7 @@
 #include <cstdlib>
 #include <optional>
 
+#include "codec/pattern_search.h"
 #include "plugin/data_package.h"
 #include "tools/datapack/format_limits.h"
 #include "tools/datapack/json_mapping.h"
@@ -59,7 +60,7 @@ class Parser {
   static constexpr std::size_t npos = std::string_view::npos;
 
  public:
-  Parser(std::string_view text, std::size_t at) : text_(text), at_(at) {}
+  Parser(std::string_view text, std::size_t at) : text_(text), at_(at), runStart_(at) {}
 
   std::size_t At() const { return at_; }
   bool AtEnd() {
@@ -136,9 +137,11 @@ class Parser {
     Fail(tag.offset, message + ", found " + Quoted(text_.substr(tag.offset, tag.end - tag.offset)));
   }
 
+  // Indentation runs long in deep packages: it is skipped sixteen bytes at a step.
   void SkipSpace() {
-    while (at_ < text_.size() && IsSpace(text_[at_]))
-      ++at_;
+    const char* const start = text_.data() + at_;
+    const char* const end = pattern_search::SkipIndentation(start, text_.data() + text_.size());
+    at_ += static_cast<std::size_t>(end - start);
   }
 
   Tag ReadTag(std::size_t offset) const {
@@ -182,8 +185,9 @@ class Parser {
       Fail(at_, at_ == text_.size() ? "the text ends before the directory does"
                                     : "expected a tag, found " + Quoted(text_.substr(at_)));
     }
-    at_ = tag->end;
     NoticeBreak(tag->offset);
+    at_ = tag->end;
+    runStart_ = at_;
     return *tag;
   }
 
@@ -191,6 +195,9 @@ class Parser {
   std::optional<std::size_t> firstBreak[2];
 
   void NoticeBreak(std::size_t tag) {
+    if (firstBreak[false] && firstBreak[true]) return;
+    // Once LF is known, only a CR starts the other kind.
+    if (firstBreak[false] && text_.substr(runStart_, tag - runStart_).find('\r') == npos) return;
     std::size_t at = tag;
     while (at > 0 && text_[at - 1] == '\t')
       --at;
@@ -223,6 +230,9 @@ class Parser {
       Notice(open.offset, false, NumbersProblem(value, *open.kind));
     }
     path_.resize(pathLength);
+    // A break before the closing tag stands in the whitespace after the value.
+    runStart_ =
+        value.empty() ? at_ : static_cast<std::size_t>(value.data() + value.size() - text_.data());
     at_ = close;
     Close(open.name);
   }
@@ -296,6 +306,7 @@ class Parser {
 
   std::string_view text_;
   std::size_t at_;
+  std::size_t runStart_;  // of the whitespace before the next tag
   std::string path_;
   std::vector<datapack::Note> notes_;
   std::vector<FoundDirectory> found_;
