@@ -3,6 +3,7 @@
 #include <climits>
 #include <cstring>
 
+#include "codec/package_output.h"
 #include "plugin/data_package.h"
 
 const char* Lum_DataPackage::bufferStart = nullptr;
@@ -35,30 +36,6 @@ void Lum_DataPackage::SetBuffer(char* buffer, unsigned int size) {
   ForgetSearches();
 }
 
-namespace {
-
-// Most pieces are a few bytes long: copied by fixed-size moves, which need no call, that overlap
-// where the piece is shorter than two of them.
-char* CopyPiece(std::string_view piece, char* out) {
-  const char* in = piece.data();
-  const std::size_t size = piece.size();
-  if (size >= 16) {
-    std::memcpy(out, in, size);
-  } else if (size >= 8) {
-    std::memcpy(out, in, 8);
-    std::memcpy(out + size - 8, in + size - 8, 8);
-  } else if (size >= 4) {
-    std::memcpy(out, in, 4);
-    std::memcpy(out + size - 4, in + size - 4, 4);
-  } else {
-    for (std::size_t i = 0; i < size; ++i)
-      out[i] = in[i];
-  }
-  return out + size;
-}
-
-}  // namespace
-
 // Reading stops at the first NUL, and never looks past bufferEnd for one.
 void Lum_DataPackage::EndTextAtNul() {
   const auto size = static_cast<std::size_t>(bufferEnd - bufferStart);
@@ -75,23 +52,17 @@ int Lum_DataPackage::BufferAppend(int length) {
   return length;
 }
 
-// Pieces are appended as one: copied whole with a NUL after them when they fit together with
-// that NUL, otherwise not at all. Either way they are counted, so that a first pass into a small
-// buffer measures the package. Counts stop at INT_MAX, which no buffer of an int size reaches.
+// Output::Append for a list of pieces made at run time.
 void Lum_DataPackage::AppendPieces(std::initializer_list<std::string_view> pieces) {
   long long length = 0;
   for (std::string_view piece : pieces)
     length += static_cast<long long>(piece.size());
-  const long long end = bufferCursor + length;
-  if (end < bufferEnd - bufferStart) {
-    // The caller's buffer, writable: the member is const for the readers' sake.
-    char* out = const_cast<char*>(bufferStart) + bufferCursor;
+  package_output::Output output{bufferStart, bufferEnd, bufferCursor, requiredSize};
+  if (char* out = output.Reserve(length)) {
     for (std::string_view piece : pieces)
-      out = CopyPiece(piece, out);
+      out = package_output::CopyPiece(piece, out);
     *out = '\0';
   }
-  bufferCursor = static_cast<int>(std::min<long long>(end, INT_MAX - 1));
-  requiredSize = static_cast<int>(std::min<long long>(requiredSize + length, INT_MAX));
 }
 
 const char* Lum_DataPackage::GetTabs() { return Indentation().data(); }
@@ -102,12 +73,7 @@ const char* Lum_DataPackage::GetNewline() {
   return newlineBuffer;
 }
 
-// GetNewline and GetTabs with their lengths, as the element writers put them together.
+// GetNewline and GetTabs with their lengths.
 std::string_view Lum_DataPackage::Newline() { return fileNoTxtChan ? "\n" : "\r\n"; }
 
-std::string_view Lum_DataPackage::Indentation() {
-  const int tabs = std::clamp(treeDepth, 0, kMaxTabs);
-  std::memset(tabsBuffer, '\t', static_cast<std::size_t>(tabs));
-  tabsBuffer[tabs] = '\0';
-  return {tabsBuffer, static_cast<std::size_t>(tabs)};
-}
+std::string_view Lum_DataPackage::Indentation() { return package_output::Tabs(treeDepth); }

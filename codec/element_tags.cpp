@@ -5,11 +5,15 @@
 
 #include "codec/number_format.h"
 #include "codec/number_scan.h"
+#include "codec/package_output.h"
 #include "codec/pattern_search.h"
 #include "codec/white_space.h"
 #include "plugin/data_package.h"
 
 namespace {
+
+using package_output::LineStart;
+using package_output::Output;
 
 // Formats floats as the readers take them back: a space between numbers, a comma
 // before the space that starts a new row of four.
@@ -61,7 +65,8 @@ const char* NearbyTagEnd(const char* from, const char* textEnd, std::string_view
 
 bool Lum_DataPackage::XML_OpeningTag(char* name) {
   if (write) {
-    AppendPieces({Newline(), Indentation(), "<", name, ">"});
+    Output{bufferStart, bufferEnd, bufferCursor, requiredSize}.Append(
+        LineStart(fileNoTxtChan, treeDepth), "<", name, ">");
   } else {
     const std::string_view wanted(name);
     std::string_view content;
@@ -81,9 +86,10 @@ bool Lum_DataPackage::XML_OpeningTag(char* name) {
 
 bool Lum_DataPackage::XML_OpeningIDTag(char* name, int id) {
   if (write) {
-    char number[12];
+    char number[16];  // 11 would do, but the compiler takes the piece for one of up to 16 bytes
     const std::string_view idText(number, numbers::FormatInt(id, number));
-    AppendPieces({Newline(), Indentation(), "<", name, " id=\"", idText, "\">"});
+    Output{bufferStart, bufferEnd, bufferCursor, requiredSize}.Append(
+        LineStart(fileNoTxtChan, treeDepth), "<", name, " id=\"", idText, "\">");
     ++treeDepth;
     return true;
   }
@@ -112,7 +118,8 @@ bool Lum_DataPackage::XML_OpeningIDTag(char* name, int id) {
 void Lum_DataPackage::XML_ClosingTag(char* name) {
   --treeDepth;
   if (write) {
-    AppendPieces({Newline(), Indentation(), "</", name, ">"});
+    Output{bufferStart, bufferEnd, bufferCursor, requiredSize}.Append(
+        LineStart(fileNoTxtChan, treeDepth), "</", name, ">");
     return;
   }
   const std::string_view wanted(name, pattern_search::TextLength(name, tagName));
@@ -130,8 +137,9 @@ void Lum_DataPackage::XML_ClosingTag(char* name) {
 
 void Lum_DataPackage::WriteTypedElement(std::string_view name, std::string_view type,
                                         std::string_view value) {
-  AppendPieces(
-      {Newline(), Indentation(), "<", name, " Type=\"", type, "\"> ", value, " </", name, ">"});
+  Output{bufferStart, bufferEnd, bufferCursor, requiredSize}.Append(
+      LineStart(fileNoTxtChan, treeDepth), "<", name, " Type=\"", type, "\"> ", value, " </", name,
+      ">");
 }
 
 // Reading: takes the element at the next "<" when its name is `name`, leaving the cursor just

@@ -11,9 +11,9 @@ namespace {
 constexpr int kPrecision = 6;  // what "%g" uses without an explicit precision
 
 // Lays out `count` significant digits (no trailing zeros) whose first has decimal exponent
-// `exp10` the way "%g" does. Works in fixed-size chunks inside `local`, which may hold scratch
+// `exp10` the way "%g" does. Works in fixed-size chunks, writing up to 14 bytes at `local`, scratch
 // past the returned length; `digits` must stay readable for eight bytes past each copy start.
-std::size_t LayOut(const char* digits, int count, int exp10, char (&local)[24]) {
+std::size_t LayOut(const char* digits, int count, int exp10, char* local) {
   if (exp10 < -4 || exp10 >= kPrecision) {
     local[0] = digits[0];
     int length = 1;
@@ -98,7 +98,7 @@ bool SixDigits(float value, std::uint32_t& digits, int& exp10) {
 
 // The six-digit rounding read off the float's exact decimal expansion, ties to even as printf
 // rounds: slow, but right for every value, subnormals and values next to a tie included.
-std::size_t FormatExactly(std::uint32_t magnitude, char (&local)[24]) {
+[[gnu::noinline]] std::size_t FormatExactly(std::uint32_t magnitude, char* local) {
   std::uint32_t mantissa = magnitude & 0x7fffffu;
   int exp2 = static_cast<int>(magnitude >> 23);
   if (exp2 == 0) {
@@ -199,16 +199,9 @@ std::size_t FormatFloat(float value, char* out) {
     std::memcpy(digits + 4, kDigitPairs + 2 * (six % 100), 2);
     while (digits[count - 1] == '0')
       --count;
-    char local[24];
-    const std::size_t length = LayOut(digits, count, six_exp10, local);
-    std::memcpy(p, local, length);
-    return static_cast<std::size_t>(p - out) + length;
+    return static_cast<std::size_t>(p - out) + LayOut(digits, count, six_exp10, p);
   }
-
-  char local[24];
-  const std::size_t length = FormatExactly(magnitude, local);
-  std::memcpy(p, local, length);
-  return static_cast<std::size_t>(p - out) + length;
+  return static_cast<std::size_t>(p - out) + FormatExactly(magnitude, p);
 }
 
 std::size_t FormatInt(int value, char* out) {

@@ -56,6 +56,28 @@ TEST(ElementTagsTest, WritesEveryElementForm) {
   EXPECT_EQ(Written([] { Access::XML_OpeningTag("Items"); }, 0, false), "\r\n<Items>");
 }
 
+TEST(ElementTagsTest, EveryLineStartsWithTheNewlineAndTheDepthsTabs) {
+  const struct {
+    int depth;
+    std::size_t tabs;
+  } cases[] = {{0, 0}, {1, 1}, {7, 7}, {1023, 1023}, {1024, 1023}, {5000, 1023}, {-3, 0}};
+  for (const auto& c : cases) {
+    for (const bool lineFeeds : {true, false}) {
+      const std::string line = (lineFeeds ? "\n" : "\r\n") + std::string(c.tabs, '\t');
+      float value = 1.0f;
+      EXPECT_EQ(Written([] { Access::XML_OpeningIDTag("I", 3); }, c.depth, lineFeeds),
+                line + "<I id=\"3\">")
+          << c.depth << lineFeeds;
+      EXPECT_EQ(Written([&] { Access::XML_ValueTag("V", value); }, c.depth, lineFeeds),
+                line + "<V Type=\"Val\"> 1 </V>")
+          << c.depth << lineFeeds;
+      // A closing tag leaves its depth before it is written, and lines up with its opening tag.
+      EXPECT_EQ(Written([] { Access::XML_ClosingTag("I"); }, c.depth + 1, lineFeeds), line + "</I>")
+          << c.depth << lineFeeds;
+    }
+  }
+}
+
 TEST(ElementTagsTest, TagsMoveTheDepth) {
   Written([] {
     Access::XML_OpeningTag("A");
