@@ -15,6 +15,12 @@ namespace {
 using package_output::LineStart;
 using package_output::Output;
 
+// A name, measured in one step where it stands in `field`: the directory's tag field or the
+// data names' field, as the walk passes them.
+std::string_view FieldText(const char* name, const char* field) {
+  return {name, pattern_search::TextLength(name, field)};
+}
+
 // Formats floats as the readers take them back: a space between numbers, a comma
 // before the space that starts a new row of four.
 std::string_view FormatFloats(const float* values, int count, char* out) {
@@ -66,7 +72,7 @@ const char* NearbyTagEnd(const char* from, const char* textEnd, std::string_view
 bool Lum_DataPackage::XML_OpeningTag(char* name) {
   if (write) {
     Output{bufferStart, bufferEnd, bufferCursor, requiredSize}.Append(
-        LineStart(fileNoTxtChan, treeDepth), "<", name, ">");
+        LineStart(fileNoTxtChan, treeDepth), "<", FieldText(name, tagName), ">");
   } else {
     const std::string_view wanted(name);
     std::string_view content;
@@ -89,7 +95,8 @@ bool Lum_DataPackage::XML_OpeningIDTag(char* name, int id) {
     char number[16];  // 11 would do, but the compiler takes the piece for one of up to 16 bytes
     const std::string_view idText(number, numbers::FormatInt(id, number));
     Output{bufferStart, bufferEnd, bufferCursor, requiredSize}.Append(
-        LineStart(fileNoTxtChan, treeDepth), "<", name, " id=\"", idText, "\">");
+        LineStart(fileNoTxtChan, treeDepth), "<", FieldText(name, tagName), " id=\"", idText,
+        "\">");
     ++treeDepth;
     return true;
   }
@@ -119,7 +126,7 @@ void Lum_DataPackage::XML_ClosingTag(char* name) {
   --treeDepth;
   if (write) {
     Output{bufferStart, bufferEnd, bufferCursor, requiredSize}.Append(
-        LineStart(fileNoTxtChan, treeDepth), "</", name, ">");
+        LineStart(fileNoTxtChan, treeDepth), "</", FieldText(name, tagName), ">");
     return;
   }
   const std::string_view wanted(name, pattern_search::TextLength(name, tagName));
@@ -200,7 +207,7 @@ bool Lum_DataPackage::ReadTypedElementName(const char* name) {
 
 void Lum_DataPackage::XML_StringTag(char* name, char* text) {
   if (write) {
-    WriteTypedElement(name, "Txt", text);
+    WriteTypedElement(FieldText(name, strg2), "Txt", text);
   } else if (ReadTypedElementName(name)) {
     CutStringBefore("</", text);
     MovePast(">");
@@ -211,7 +218,7 @@ void Lum_DataPackage::XML_StringTag(char* name, char* text) {
 
 void Lum_DataPackage::XML_ValueTag(char* name, float& value) {
   if (write) {
-    WriteTypedElement(name, "Val", FormatFloats(&value, 1, tmp2));
+    WriteTypedElement(FieldText(name, strg2), "Val", FormatFloats(&value, 1, tmp2));
   } else if (ReadTypedElementName(name)) {
     if (const char* close =
             NearbyClose(ScanNumbers(bufferStart + bufferCursor, textEnd, 1, &value), textEnd)) {
@@ -227,7 +234,7 @@ void Lum_DataPackage::XML_ValueTag(char* name, float& value) {
 void Lum_DataPackage::XML_VectorTag(char* name, D3DXVECTOR3& vector) {
   float values[3] = {vector.x, vector.y, vector.z};
   if (write) {
-    WriteTypedElement(name, "Vec", FormatFloats(values, 3, tmp2));
+    WriteTypedElement(FieldText(name, strg2), "Vec", FormatFloats(values, 3, tmp2));
     return;
   }
   if (ReadTypedElementName(name)) {
@@ -247,7 +254,7 @@ void Lum_DataPackage::XML_MatrixTag(char* name, D3DXMATRIX& matrix) {
   float values[16];
   std::memcpy(values, &matrix, sizeof(values));
   if (write) {
-    WriteTypedElement(name, "Mat", FormatFloats(values, 16, tmp2));
+    WriteTypedElement(FieldText(name, strg2), "Mat", FormatFloats(values, 16, tmp2));
     return;
   }
   if (ReadTypedElementName(name)) {
