@@ -361,7 +361,7 @@ int main(int argc, char** argv) {
   using namespace bench;
   // Defaults first, so that the caller's flags win.
   std::vector<char*> arguments = {argv[0]};
-  std::string folder = ".";
+  std::string folder;  // no files without --out: a run from the sources left them there
   char repetitions[] = "--benchmark_repetitions=3";
   char minTime[] = "--benchmark_min_time=0.2";
   arguments.push_back(repetitions);

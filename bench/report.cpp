@@ -331,6 +331,7 @@ void Report(const std::vector<Figures>& all, const std::vector<std::string>& wor
     }
   }
   std::fputs(out.str().c_str(), stdout);
+  if (folder.empty()) return;
   std::ofstream(folder + "/results.txt") << out.str();
 
   std::ofstream json(folder + "/results.json");

@@ -39,7 +39,7 @@ struct Machine {
 Machine ThisMachine();
 
 // Prints the tables to stdout and writes results.json, results.txt, throughput.dat, ratios.dat
-// and chart-title.gp into `folder`.
+// and chart-title.gp into `folder`, unless it is empty.
 void Report(const std::vector<Figures>& figures, const std::vector<std::string>& workloads,
             const Machine& machine, const std::string& folder);
 
