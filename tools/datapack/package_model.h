@@ -49,7 +49,6 @@ class Entries {
 
   std::size_t size() const { return count_; }
   bool empty() const { return count_ == 0; }
-  std::size_t first() const { return first_; }
   Entry operator[](std::size_t i) const;
 
  private:

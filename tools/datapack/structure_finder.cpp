@@ -4,6 +4,7 @@
 #include <optional>
 
 #include "codec/pattern_search.h"
+#include "codec/white_space.h"
 #include "plugin/data_package.h"
 #include "tools/datapack/format_limits.h"
 #include "tools/datapack/json_mapping.h"
@@ -14,13 +15,10 @@ namespace {
 constexpr std::string_view kTypeAttribute = "Type=\"";
 constexpr std::string_view kIdAttribute = "id=\"";
 
-// The reader's whitespace.
-bool IsSpace(char c) { return c == ' ' || c == '\t' || c == '\r' || c == '\n'; }
-
 std::string_view Trim(std::string_view text) {
-  while (!text.empty() && IsSpace(text.front()))
+  while (!text.empty() && IsWhiteSpaceChar(text.front()))
     text.remove_prefix(1);
-  while (!text.empty() && IsSpace(text.back()))
+  while (!text.empty() && IsWhiteSpaceChar(text.back()))
     text.remove_suffix(1);
   return text;
 }
@@ -317,7 +315,7 @@ class Parser {
 Structure FindStructure(std::string_view text) {
   // The text ends with the closing tag of its directory; the header may hold anything.
   std::size_t end = text.size();
-  while (end > 0 && IsSpace(text[end - 1]))
+  while (end > 0 && IsWhiteSpaceChar(text[end - 1]))
     --end;
   if (end == 0) throw StructureError(0, "no package: the text is empty");
   const std::size_t close = text.rfind("</", end - 1);
