@@ -419,6 +419,7 @@ int ScanFloats(const char* first, const char* last, std::string_view format, flo
 int ScanFloatGroups(const char* first, const char* last, int count, int group, float* values,
                     const char** end) {
   int stored = 0;
+  int inGroup = 0;
   const char* p = first;
   for (;;) {
     // The plain path first, here, without the call: nearly every number of a package takes it.
@@ -432,9 +433,10 @@ int ScanFloatGroups(const char* first, const char* last, int count, int group, f
     }
     p = scanned;
     if (++stored == count) break;
-    if (stored % group == 0) {
+    if (++inGroup == group) {
       if (At(p, last) != ',') break;
       ++p;
+      inGroup = 0;
     }
   }
   *end = p;
