@@ -135,6 +135,8 @@ Machine ThisMachine() {
     if (line.rfind("processor", 0) == 0) ++machine.cores;
   }
   if (machine.cores == 0) machine.cores = static_cast<int>(std::thread::hardware_concurrency());
+  // Figures of the engine's processor mode must not pass for those of the usual build.
+  if constexpr (sizeof(void*) == 4) machine.cpu += ", 32-bit build";
   const std::time_t now = std::time(nullptr);
   char date[32];
   std::strftime(date, sizeof(date), "%Y-%m-%d %H:%M UTC", std::gmtime(&now));
