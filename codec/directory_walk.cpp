@@ -7,6 +7,7 @@
 #include <cstring>
 
 #include "codec/cleanup.h"
+#include "codec/pattern_search.h"
 #include "host/matrix_channel.h"
 #include "host/value_channel.h"
 #include "host/vector_channel.h"
@@ -35,8 +36,12 @@ char* NameIn(char (&field)[Lum_DataPackage::kTextLength], const char* name) {
   while (name[length] != '\0') {
     if (++length == sizeof(field)) return const_cast<char*>(name);
   }
-  for (std::size_t i = 0; i <= length; ++i)
-    field[i] = name[i];
+  if (length < 16) {
+    pattern_search::StoreShortText(field, name, length);
+  } else {
+    for (std::size_t i = 0; i <= length; ++i)
+      field[i] = name[i];
+  }
   return field;
 }
 

@@ -105,4 +105,19 @@ TEST(PatternSearchTest, MeasuresTextsInAFieldAsStrlenDoes) {
   }
 }
 
+TEST(PatternSearchTest, StoresShortTextsWhole) {
+  // Read from a guarded copy of exactly the text, into a field full of another text: nothing
+  // past the text is read, and the field holds it, its NUL, and nothing of the old one.
+  const std::string text = "abcdefghijklmno";
+  for (std::size_t length = 0; length < 16; ++length) {
+    char field[32];
+    std::memset(field, 'x', sizeof(field));
+    const GuardedBuffer source(text.substr(0, length));
+    pattern_search::StoreShortText(field, source.data(), length);
+    EXPECT_EQ(std::string(field), text.substr(0, length));
+    EXPECT_EQ(pattern_search::TextLength(field, field), length);
+    EXPECT_EQ(field[16], 'x') << length;
+  }
+}
+
 }  // namespace
