@@ -475,5 +475,50 @@ TEST(ScanFloatsTest, MatchesSscanfOnRandomTexts) {
   }
 }
 
+// Groups as packages hold them: short decimals, mostly plain enough for the reader's quickest
+// route, with the rest of the package after them.
+TEST(ScanFloatsTest, MatchesSscanfOnPackageGroups) {
+#if defined(_WIN32)
+  GTEST_SKIP()
+      << "the oracle is glibc; a Windows C runtime prints and scans some numbers its own way";
+#endif
+  std::setlocale(LC_ALL, "C");
+  std::mt19937_64 random(17);
+  const auto below = [&random](std::size_t n) { return static_cast<std::size_t>(random() % n); };
+  const auto digits = [&below](std::size_t count) {
+    std::string text;
+    for (std::size_t i = 0; i < count; ++i)
+      text += static_cast<char>('0' + below(10));
+    return text;
+  };
+  // Mostly what writers write; now and then what the quickest route leaves to the others: a
+  // ninth digit, a second point, an exponent, a hexadecimal prefix, a lone sign or point, a NUL.
+  const auto number = [&]() -> std::string {
+    static constexpr std::string_view kSigns[] = {"", "", "", "-", "+"};
+    static constexpr std::string_view kOdd[] = {"", "", "", "", "",  "",  "",   "",
+                                                "", "", "", "", "e", "x", "\0", "."};
+    std::string text(kSigns[below(5)]);
+    text += digits(below(7));
+    if (below(4) != 0) text += "." + digits(below(6));
+    return text + std::string(kOdd[below(16)]);
+  };
+  static constexpr std::string_view kGaps[] = {" ", " ", " ", " ", "  ", "\t", "\n\t\t", ""};
+  static constexpr std::string_view kAfter[] = {
+      " </Origin>\n\t\t\t<Name Type=\"Txt\"> Room </Name>\n\t\t</Rooms>", " </T>", ""};
+  EdgeBuffer buffer(8192);
+  int failures = 0;
+  for (int i = 0; i < 200'000 && failures < 10; ++i) {
+    const bool matrix = below(2) != 0;
+    std::string text(kGaps[below(8)]);
+    for (int n = 0; n < (matrix ? 16 : 3); ++n) {
+      if (n > 0)
+        text += std::string(matrix && n % 4 == 0 ? "," : "") + std::string(kGaps[below(8)]);
+      text += number();
+    }
+    text += kAfter[below(3)];
+    failures += !SameAsGlibc(buffer, text, matrix ? kMatrix : kVector);
+  }
+}
+
 }  // namespace
 }  // namespace numbers
