@@ -5,9 +5,12 @@
 #include <string>
 
 #if defined(_WIN32)
+#include <process.h>
 #define WIN32_LEAN_AND_MEAN
 #include <windows.h>
 #else
+#include <unistd.h>
+
 #include <cerrno>
 #include <cstring>
 #endif
@@ -47,9 +50,23 @@ std::string MissingFileMessage() {
 }
 
 // A folder of the test's own, removed with everything in it when the test ends.
+int ProcessId() {
+#if defined(_WIN32)
+  return _getpid();
+#else
+  return static_cast<int>(getpid());
+#endif
+}
+
 class ScratchFolder {
  public:
-  ScratchFolder() : path_(fs::temp_directory_path() / "channel_library_test") {
+  // One per test and process: ctest runs tests side by side, and one test's folder going with it
+  // took the other's file away.
+  ScratchFolder()
+      : path_(fs::temp_directory_path() /
+              ("channel_library_test_" +
+               std::string(::testing::UnitTest::GetInstance()->current_test_info()->name()) + "_" +
+               std::to_string(ProcessId()))) {
     fs::create_directories(path_);
   }
   ~ScratchFolder() { fs::remove_all(path_); }
